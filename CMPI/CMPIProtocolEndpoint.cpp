@@ -1,0 +1,183 @@
+#include "CMPI/CMPIProtocolEndpoint.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+static const std::string loggerCMPIProtocolEndpoint = "Tarvo.IPInterfaceProvider";
+
+namespace {
+
+const char* const kClassName = "KVRNX_IPProtocolEndpoint";
+
+// A method argument; an absent argument (or no argument list) reads as untyped.
+CMPIData argument(const CMPIArgs* in, const char* name) {
+    CMPIData data = {};
+    data.type = CMPI_null;
+    data.state = CMPI_notFound;
+    if (!in) return data;
+    CMPIStatus rc = {CMPI_RC_OK, nullptr};
+    CMPIData found = CMGetArg(in, name, &rc);
+    if (rc.rc != CMPI_RC_OK || (found.state & CMPI_notFound)) return data;
+    return found;
+}
+
+}  // namespace
+
+CMPIProtocolEndpoint::CMPIProtocolEndpoint(const CMPIBroker* broker, const CMPIContext* context,
+                                           const std::string& nameSpace)
+    : CMPIAdapter(broker, context, nameSpace, loggerCMPIProtocolEndpoint, NX_FILE) {
+    const std::string params =
+        parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
+    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+}
+
+CMPIProtocolEndpoint::CMPIProtocolEndpoint(const CMPIBroker* broker, const CMPIContext* context,
+                                           const CMPIObjectPath* path)
+    : CMPIAdapter(broker, context, ProviderUtilities::getNamespace(path), loggerCMPIProtocolEndpoint, NX_FILE) {
+    const std::string params = parameterList(" _broker=", broker, " _context=", context, " objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    setObjectPath(path);
+    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+}
+
+void CMPIProtocolEndpoint::setObjectPath(const CMPIObjectPath* path) {
+    const std::string params = parameterList(" objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    // The class keys are ours by construction; only system and interface name select.
+    if (ProviderUtilities::getKeyCount(path) != 0) {
+        std::string value;
+        if (ProviderUtilities::getKeyProperty(path, "SystemName", value)) {
+            NX_VAR(loggerCMPIProtocolEndpoint, "SystemName", value.c_str());
+            model.setFilter(IPprotocolEndpoint::FilterType::BySystemName, value);
+        }
+        if (ProviderUtilities::getKeyProperty(path, "Name", value)) {
+            NX_VAR(loggerCMPIProtocolEndpoint, "Name", value.c_str());
+            model.setFilter(IPprotocolEndpoint::FilterType::ByName, value);
+        }
+    }
+    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+}
+
+CMPIObjectPath* CMPIProtocolEndpoint::getObjectPath() {
+    NX_ENTER(loggerCMPIProtocolEndpoint);
+    CMPIObjectPath* path = newClassPath(kClassName);
+    if (path) {
+        copyKey(path, "Name", &IPprotocolEndpoint::getName);
+        copyKey(path, "CreationClassName", &IPprotocolEndpoint::getCreationClassName);
+        copyKey(path, "SystemName", &IPprotocolEndpoint::getSystemName);
+        copyKey(path, "SystemCreationClassName", &IPprotocolEndpoint::getSystemCreationClassName);
+    }
+    NX_EXIT(loggerCMPIProtocolEndpoint);
+    return path;
+}
+
+CMPIInstance* CMPIProtocolEndpoint::getCMPIInstance(const char** properties) {
+    // The property list is the object manager's to apply; every property is offered.
+    const std::string params = parameterList(" properties=", properties);
+    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    CMPIInstance* instance = ProviderUtilities::createInstance(broker, getObjectPath());
+    if (instance) {
+        using M = IPprotocolEndpoint;
+        copyProperty<std::string>(instance, "ElementName", &M::getElementName);
+        copyProperty<std::string>(instance, "Description", &M::getDescription);
+        copyProperty<std::string>(instance, "IPv4Address", &M::getIPv4Address);
+        copyProperty<std::string>(instance, "IPv6Address", &M::getIPv6Address);
+        copyProperty<std::string>(instance, "SubnetMask", &M::getSubnetMask);
+        // The class declares PrefixLength uint8; the host reports a wider number.
+        copyProperty<unsigned int, unsigned char>(instance, "PrefixLength", &M::getPrefixLength);
+        copyProperty<unsigned short>(instance, "IPv6SubnetPrefixLength", &M::getIPv6SubnetPrefixLength);
+        copyProperty<unsigned short>(instance, "AddressType", &M::getAddressType);
+        copyProperty<unsigned short>(instance, "IPv6AddressType", &M::getIPv6AddressType);
+        copyProperty<unsigned short>(instance, "IPVersionSupport", &M::getIPVersionSupport);
+        copyProperty<unsigned short>(instance, "ProtocolIFType", &M::getProtocolIFType);
+        copyProperty<unsigned short>(instance, "EnabledState", &M::getEnabledState);
+        copyProperty<unsigned short>(instance, "RequestedState", &M::getRequestedState);
+        unsigned short origin = 0;
+        if (model.getAddressOrigin(origin)) {
+            NX_VAR(loggerCMPIProtocolEndpoint, "IPOrigin in u16", static_cast<unsigned>(origin));
+            ProviderUtilities::setProperty(instance, "AddressOrigin", origin);
+        }
+        copyProperty<std::string>(instance, "SystemCreationClassName", &M::getSystemCreationClassName);
+        copyProperty<std::string>(instance, "SystemName", &M::getSystemName);
+        copyProperty<std::string>(instance, "CreationClassName", &M::getCreationClassName);
+        copyProperty<std::string>(instance, "Name", &M::getName);
+        copyProperty<std::string>(instance, "NameFormat", &M::getNameFormat);
+    }
+    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    return instance;
+}
+
+CMPIStatus CMPIProtocolEndpoint::modifyInstance(const CMPIInstance* newInstance) {
+    const std::string params = parameterList(" newInstance=", newInstance);
+    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIObjectPath* path = newInstance ? CMGetObjectPath(newInstance, nullptr) : nullptr;
+    if (path) {
+        setObjectPath(path);
+        NX_VAR(loggerCMPIProtocolEndpoint, "objstring", ProviderUtilities::toString(broker, path).c_str());
+    }
+    // Each accepted value is applied at once; a later rejection does not undo an earlier write.
+    unsigned short origin = 0;
+    if (ProviderUtilities::getProperty(newInstance, "AddressOrigin", origin)) {
+        NX_VAR(loggerCMPIProtocolEndpoint, "AddressOrigin", static_cast<unsigned>(origin));
+        model.setAddressOrigin(origin);
+    }
+    std::string address;
+    if (ProviderUtilities::getProperty(newInstance, "IPv4Address", address)) {
+        NX_VAR(loggerCMPIProtocolEndpoint, "IPv4Address:", address.c_str());
+        if (ProviderUtilities::ValidateInput(address, "") == 0) {
+            status.rc = CMPI_RC_ERR_INVALID_PARAMETER;
+        } else {
+            model.setIPv4Address(address);
+        }
+    }
+    std::string mask;
+    if (status.rc == CMPI_RC_OK && ProviderUtilities::getProperty(newInstance, "SubnetMask", mask)) {
+        NX_VAR(loggerCMPIProtocolEndpoint, "SubnetMask:", mask.c_str());
+        if (ProviderUtilities::ValidateInput(mask, "") == 0) {
+            status.rc = CMPI_RC_ERR_INVALID_PARAMETER;
+        } else {
+            model.setSubnetMask(mask);
+        }
+    }
+    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    return status;
+}
+
+CMPIUint32 CMPIProtocolEndpoint::executeMethod(const CMPIArgs* in, CMPIArgs* out, CMPIStatus* status) {
+    NX_METHOD(loggerCMPIProtocolEndpoint);
+    const auto refuse = [&](CMPIrc rc, const char* text) -> CMPIUint32 {
+        if (status) *status = makeStatus(rc, text);
+        return 4;
+    };
+
+    const CMPIData requested = argument(in, "RequestedState");
+    if (requested.type != CMPI_uint16) return refuse(CMPI_RC_ERR_INVALID_PARAMETER, "Invalid Type of Parameter");
+    // Only its type matters: the state change is made at once.
+    const CMPIData timeout = argument(in, "TimeoutPeriod");
+    if (timeout.type != CMPI_dateTime)
+        return refuse(CMPI_RC_ERR_INVALID_PARAMETER, "Invalid Type of TimeOut Parameter");
+
+    const unsigned short state = (requested.state & CMPI_nullValue) ? 0 : requested.value.uint16;
+    NX_VAR(loggerCMPIProtocolEndpoint, "RequestedState", static_cast<unsigned>(state));
+    if (state != 2 && state != 3 && state != 11)
+        return refuse(CMPI_RC_ERR_FAILED, "Invalid Value of RequestedState Parameter");
+    // Clients have always been told this text when the host refuses the change.
+    if (!model.setEnabledState(state)) return refuse(CMPI_RC_ERR_FAILED, "Invalid Type of TimeOut Parameter");
+
+    NX_MESSAGE(loggerCMPIProtocolEndpoint, 3000, "Calling CMNewObjectPath for ConcreteJob");
+    CMPIObjectPath* job = newClassPath("KVRNX_ConcreteJob");
+    if (!job) return 0;
+    ProviderUtilities::setKeyProperty(job, "InstanceID", std::string("IPConfigSvcJob:1"));
+    if (out) {
+        CMPIValue reference;
+        reference.ref = job;
+        CMAddArg(out, "Job", &reference, CMPI_ref);
+    }
+    NX_MESSAGE(loggerCMPIProtocolEndpoint, 3000, "Job Created Successfully");
+    return 0;
+}
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx

@@ -1,0 +1,104 @@
+#include "CMPI/CMPIRemoteServiceAccessPoint.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+static const std::string loggerCMPIRemoteServiceAccessPoint = "Tarvo.IPInterfaceProvider";
+
+CMPIRemoteServiceAccessPoint::CMPIRemoteServiceAccessPoint(const CMPIBroker* broker, const CMPIContext* context,
+                                                           const std::string& nameSpace)
+    : CMPIAdapter(broker, context, nameSpace, loggerCMPIRemoteServiceAccessPoint, NX_FILE) {
+    const std::string params =
+        parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
+    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+}
+
+CMPIRemoteServiceAccessPoint::CMPIRemoteServiceAccessPoint(const CMPIBroker* broker, const CMPIContext* context,
+                                                           const CMPIObjectPath* path)
+    : CMPIAdapter(broker, context, ProviderUtilities::getNamespace(path), loggerCMPIRemoteServiceAccessPoint,
+                  NX_FILE) {
+    const std::string params = parameterList(" _broker=", broker, " _context=", context, " objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    setObjectPath(path);
+    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+}
+
+void CMPIRemoteServiceAccessPoint::setObjectPath(const CMPIObjectPath* path) {
+    const std::string params = parameterList(" objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    if (ProviderUtilities::getKeyCount(path) != 0) {
+        std::string value;
+        if (ProviderUtilities::getKeyProperty(path, "SystemName", value)) {
+            NX_VAR(loggerCMPIRemoteServiceAccessPoint, "SystemName", value.c_str());
+            model.setFilter(RemoteServiceAccessPoint::FilterType::BySystemName, value);
+        }
+        if (ProviderUtilities::getKeyProperty(path, "Name", value)) {
+            NX_VAR(loggerCMPIRemoteServiceAccessPoint, "Name", value.c_str());
+            model.setFilter(RemoteServiceAccessPoint::FilterType::ByName, value);
+        }
+    }
+    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+}
+
+CMPIObjectPath* CMPIRemoteServiceAccessPoint::getObjectPath() {
+    NX_ENTER(loggerCMPIRemoteServiceAccessPoint);
+    CMPIObjectPath* path = newClassPath("KVRNX_IPRemoteServiceAccessPoint");
+    if (path) {
+        copyKey(path, "SystemCreationClassName", &RemoteServiceAccessPoint::getSystemCreationClassName);
+        copyKey(path, "SystemName", &RemoteServiceAccessPoint::getSystemName);
+        copyKey(path, "CreationClassName", &RemoteServiceAccessPoint::getCreationClassName);
+        copyKey(path, "Name", &RemoteServiceAccessPoint::getName);
+    }
+    NX_EXIT(loggerCMPIRemoteServiceAccessPoint);
+    return path;
+}
+
+CMPIInstance* CMPIRemoteServiceAccessPoint::getCMPIInstance(const char** properties) {
+    const std::string params = parameterList(" properties=", properties);
+    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    CMPIInstance* instance = ProviderUtilities::createInstance(broker, getObjectPath(), properties);
+    if (instance) {
+        using M = RemoteServiceAccessPoint;
+        copyProperty<std::string>(instance, "ElementName", &M::getElementName);
+        copyProperty<std::string>(instance, "AccessInfo", &M::getAccessInfo);
+        copyProperty<std::string>(instance, "OtherAccessContext", &M::getOtherAccessContext);
+        copyProperty<unsigned short>(instance, "InfoFormat", &M::getInfoFormat);
+        copyProperty<unsigned short>(instance, "AccessContext", &M::getAccessContext);
+        copyProperty<std::string>(instance, "SystemCreationClassName", &M::getSystemCreationClassName);
+        copyProperty<std::string>(instance, "SystemName", &M::getSystemName);
+        copyProperty<std::string>(instance, "CreationClassName", &M::getCreationClassName);
+        copyProperty<std::string>(instance, "Name", &M::getName);
+    }
+    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    return instance;
+}
+
+CMPIStatus CMPIRemoteServiceAccessPoint::modifyInstance(const CMPIInstance* newInstance) {
+    const std::string params = parameterList(" newInstance=", newInstance);
+    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    const CMPIObjectPath* path = newInstance ? CMGetObjectPath(newInstance, nullptr) : nullptr;
+    if (path) {
+        setObjectPath(path);
+        NX_VAR(loggerCMPIRemoteServiceAccessPoint, "objstring", ProviderUtilities::toString(broker, path).c_str());
+    }
+    std::string accessInfo;
+    if (ProviderUtilities::getProperty(newInstance, "AccessInfo", accessInfo)) {
+        NX_VAR(loggerCMPIRemoteServiceAccessPoint, "AccessInfo", accessInfo.c_str());
+        // The address ends up in a file that network scripts source as root.
+        if (ProviderUtilities::ValidateInput(accessInfo, ":") == 0) {
+            NX_MESSAGE(loggerCMPIRemoteServiceAccessPoint, 6000, "Invalid Security data passed in the property value");
+            status.rc = CMPI_RC_ERR_INVALID_PARAMETER;
+        } else {
+            // Which gateway is written follows the interface's protocol type, not the one
+            // presented; a refused write is not reported back.
+            model.setAccessInfo(accessInfo);
+        }
+    }
+    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    return status;
+}
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx

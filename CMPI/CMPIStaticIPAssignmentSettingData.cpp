@@ -1,0 +1,121 @@
+#include "CMPI/CMPIStaticIPAssignmentSettingData.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+static const std::string loggerCMPIStaticIPAssignmentSettingData = "Tarvo.IPInterfaceProvider";
+
+CMPIStaticIPAssignmentSettingData::CMPIStaticIPAssignmentSettingData(const CMPIBroker* broker,
+                                                                     const CMPIContext* context,
+                                                                     const std::string& nameSpace)
+    : CMPIAdapter(broker, context, nameSpace, loggerCMPIStaticIPAssignmentSettingData, NX_FILE) {
+    const std::string params =
+        parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
+    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+}
+
+CMPIStaticIPAssignmentSettingData::CMPIStaticIPAssignmentSettingData(const CMPIBroker* broker,
+                                                                     const CMPIContext* context,
+                                                                     const CMPIObjectPath* path)
+    : CMPIAdapter(broker, context, ProviderUtilities::getNamespace(path), loggerCMPIStaticIPAssignmentSettingData,
+                  NX_FILE) {
+    const std::string params = parameterList(" _broker=", broker, " _context=", context, " objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    setObjectPath(path);
+    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+}
+
+void CMPIStaticIPAssignmentSettingData::setObjectPath(const CMPIObjectPath* path) {
+    const std::string params = parameterList(" objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    std::string instanceId;
+    if (ProviderUtilities::getKeyCount(path) != 0 && ProviderUtilities::getKeyProperty(path, "InstanceID", instanceId)) {
+        NX_VAR(loggerCMPIStaticIPAssignmentSettingData, "InstanceID", instanceId.c_str());
+        model.setFilter(StaticIPAssignmentSettingData::FilterType::ByInstanceID, instanceId);
+    }
+    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+}
+
+CMPIObjectPath* CMPIStaticIPAssignmentSettingData::getObjectPath() {
+    NX_ENTER(loggerCMPIStaticIPAssignmentSettingData);
+    CMPIObjectPath* path = newClassPath("KVRNX_StaticIPAssignmentSettingData");
+    std::string instanceId;
+    if (path && model.getInstanceID(instanceId)) {
+        NX_VAR(loggerCMPIStaticIPAssignmentSettingData, "instanceID", instanceId.c_str());
+        ProviderUtilities::setKeyProperty(path, "InstanceID", instanceId);
+    }
+    NX_EXIT(loggerCMPIStaticIPAssignmentSettingData);
+    return path;
+}
+
+CMPIInstance* CMPIStaticIPAssignmentSettingData::getCMPIInstance(const char** properties) {
+    const std::string params = parameterList(" properties=", properties);
+    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    CMPIInstance* instance = ProviderUtilities::createInstance(broker, getObjectPath());
+    if (instance) {
+        using M = StaticIPAssignmentSettingData;
+        copyProperty<std::string>(instance, "InstanceID", &M::getInstanceID);
+        copyProperty<std::string>(instance, "ElementName", &M::getElementName);
+        copyProperty<unsigned short>(instance, "AddressOrigin", &M::getAddressOrigin);
+        copyProperty<std::string>(instance, "IPv4Address", &M::getIPv4Address);
+        copyProperty<std::string>(instance, "IPv6Address", &M::getIPv6Address);
+        copyProperty<std::string>(instance, "SubnetMask", &M::getSubnetMask);
+        copyProperty<std::string>(instance, "GatewayIPv4Address", &M::getGatewayIPv4Address);
+        copyProperty<unsigned short>(instance, "IPv6SubnetPrefixLength", &M::getIPv6SubnetPrefixLength);
+        // Both type getters land in IPv6AddressType, the IPv6 one last; the instance has never
+        // carried an AddressType and clients read the type from here.
+        copyProperty<unsigned short>(instance, "IPv6AddressType", &M::getAddressType);
+        copyProperty<unsigned short>(instance, "IPv6AddressType", &M::getIPv6AddressType);
+        copyProperty<std::string>(instance, "GatewayIPv6Address", &M::getGatewayIPv6Address);
+        copyProperty<std::string>(instance, "ConfigurationName", &M::getConfigurationName);
+    }
+    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    return instance;
+}
+
+CMPIStatus CMPIStaticIPAssignmentSettingData::modifyInstance(const CMPIInstance* newInstance) {
+    const std::string params = parameterList(" newInstance=", newInstance);
+    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    if (newInstance) {
+        const CMPIObjectPath* path = CMGetObjectPath(newInstance, nullptr);
+        setObjectPath(path);
+        NX_VAR(loggerCMPIStaticIPAssignmentSettingData, "objstring", ProviderUtilities::toString(broker, path).c_str());
+
+        using M = StaticIPAssignmentSettingData;
+        // Applies one address property if present and safe to write into the interface file.
+        // Values go in one by one: a rejection leaves the earlier ones written.
+        const auto apply = [&](const char* name, auto setter, bool ipv6) {
+            std::string value;
+            if (!ProviderUtilities::getProperty(newInstance, name, value)) return true;
+            NX_VAR(loggerCMPIStaticIPAssignmentSettingData, name, value.c_str());
+            if (ProviderUtilities::ValidateInput(value, ipv6 ? ":" : "") == 0) {
+                if (ipv6)
+                    NX_MESSAGE(loggerCMPIStaticIPAssignmentSettingData, 6000,
+                               "Invalid Security data passed in the property value");
+                status.rc = CMPI_RC_ERR_INVALID_PARAMETER;
+                return false;
+            }
+            std::invoke(setter, model, value);
+            return true;
+        };
+        if (apply("IPv4Address", &M::setIPv4Address, false) && apply("SubnetMask", &M::setSubnetMask, false) &&
+            apply("GatewayIPv4Address", &M::setGatewayIPv4Address, false) &&
+            apply("IPv6Address", &M::setIPv6Address, true) &&
+            apply("GatewayIPv6Address", &M::setGatewayIPv6Address, true)) {
+            unsigned short prefixLength = 0;
+            if (ProviderUtilities::getProperty(newInstance, "IPv6SubnetPrefixLength", prefixLength))
+                model.setIPv6SubnetPrefixLength(prefixLength);
+            // A modification that leaves ConfigurationName out clears it.
+            std::string configurationName;
+            ProviderUtilities::getProperty(newInstance, "ConfigurationName", configurationName);
+            model.setConfigurationName(configurationName);
+        }
+    }
+    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    return status;
+}
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx

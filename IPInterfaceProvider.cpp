@@ -1,0 +1,455 @@
+// Entry points, function tables, class registry and request dispatch of the IP interface provider.
+#include "IPInterfaceProvider.h"
+
+#include <cmpimacs.h>
+
+#include <cstring>
+#include <exception>
+
+#include "CMPI/CMPIAssignmentSettingData.h"
+#include "CMPI/CMPIIPConfigurationService.h"
+#include "CMPI/CMPIIPEnabledLogicalElementCapabilities.h"
+#include "CMPI/CMPIProtocolEndpoint.h"
+#include "CMPI/CMPIRemoteServiceAccessPoint.h"
+#include "CMPI/CMPIStaticIPAssignmentSettingData.h"
+#include "Nx/ProviderUtilities.h"
+#include "Trace.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+const std::string loggerIPInterfaceProvider = "Tarvo.IPInterfaceProvider";
+
+const CMPIBroker* broker = nullptr;
+const char* slpClassName = "PG_WBEMSLPTemplate";
+const char* slpMethodName = "update";
+const char* slpNameSpace = "root/PG_Internal";
+const char COPYRIGHT[] = "IP Interface Provider. Copyright (c) 2026 the IP Interface Provider authors.";
+
+CMPIInstanceMIFT instMIFT__ = {
+    CMPICurrentVersion, CMPICurrentVersion, "instanceIPInterfaceProvider",
+    IPInterface_Cleanup, IPInterface_EnumInstanceNames, IPInterface_EnumInstances, IPInterface_GetInstance,
+    IPInterface_CreateInstance, IPInterface_ModifyInstance, IPInterface_DeleteInstance, IPInterface_ExecQuery,
+};
+
+CMPIAssociationMIFT assocMIFT__ = {
+    CMPICurrentVersion, CMPICurrentVersion, "associationIPInterfaceProvider",
+    IPInterface_AssociationCleanup, IPInterface_Associators, IPInterface_AssociatorNames,
+    IPInterface_References, IPInterface_ReferenceNames,
+};
+
+CMPIMethodMIFT methMIFT__ = {
+    CMPICurrentVersion, CMPICurrentVersion, "methodIPInterfaceProvider",
+    IPInterface_MethodCleanup, IPInterface_InvokeMethod,
+};
+
+namespace {
+
+#define ENTRY_MARK() markProviderEntry(loggerIPInterfaceProvider, NX_FILE, __func__, __LINE__)
+#define EXIT_MARK() markProviderExit(loggerIPInterfaceProvider, NX_FILE, __func__, __LINE__)
+
+const char* orEmpty(const char* text) { return text ? text : ""; }
+
+// Builds the instance adapter that serves classId over cop and hands it to use.
+// False when no instance adapter serves the class.
+template <class Use>
+bool withInstanceAdapter(unsigned short classId, const CMPIContext* ctx, const CMPIObjectPath* cop, Use&& use) {
+    switch (classId) {
+    case IPProtocolEndpointId: {
+        CMPIProtocolEndpoint adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPAssignmentSettingDataId: {
+        CMPIAssignmentSettingData adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case StaticIPAssignmentSettingDataId: {
+        CMPIStaticIPAssignmentSettingData adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPRemoteServiceAccessPointId: {
+        CMPIRemoteServiceAccessPoint adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPEnabledLogicalElementCapabilitiesId: {
+        CMPIIPEnabledLogicalElementCapabilities adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPConfigurationServiceId: {
+        CMPIIPConfigurationService adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    default:
+        return false;
+    }
+}
+
+// The modifiable classes.
+template <class Use>
+bool withModifiableAdapter(unsigned short classId, const CMPIContext* ctx, const CMPIObjectPath* cop, Use&& use) {
+    switch (classId) {
+    case IPProtocolEndpointId: {
+        CMPIProtocolEndpoint adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPAssignmentSettingDataId: {
+        CMPIAssignmentSettingData adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case StaticIPAssignmentSettingDataId: {
+        CMPIStaticIPAssignmentSettingData adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPRemoteServiceAccessPointId: {
+        CMPIRemoteServiceAccessPoint adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    default:
+        return false;
+    }
+}
+
+// The association classes whose adapters are built; none yet.
+bool isServedAssociation(unsigned short) { return false; }
+
+// A null instance or path (the broker could not build one) is not handed on: an object manager
+// would have to cope with it, and some do not.
+void returnInstance(const CMPIResult* rslt, CMPIInstance* instance) {
+    if (instance) CMReturnInstance(rslt, instance);
+}
+void returnObjectPath(const CMPIResult* rslt, CMPIObjectPath* path) {
+    if (path) CMReturnObjectPath(rslt, path);
+}
+
+void logCaught(const std::exception& e) { NX_MESSAGE(loggerIPInterfaceProvider, 4000, e.what()); }
+
+}  // namespace
+
+bool getClassId(const char* className, const char* nameSpace, std::vector<unsigned short>& ids) {
+    unsigned short id = ProviderUtilities::getClassId(className);
+    if (id != UnknownClassId) {
+        ids.push_back(id);
+        return true;
+    }
+    struct Parent {
+        const char* name;
+        std::vector<unsigned short> ids;
+    };
+    static const Parent parents[] = {
+        {"CIM_ElementSettingData", {IPElementSettingDataId, StaticIPElementSettingDataId}},
+        {"CIM_OrderedComponent", {StaticOrderedComponentId}},
+        {"CIM_BindsToLanEndPoint", {BindsToLanEndPointId}},
+        {"CIM_HostedAccessPoint", {IPHostedAccessPointId, SPHostedAccessPointId, RemoteHostedAccessPointId}},
+        {"CIM_RemoteAccessAvailableToElement", {IPRemoteAccessAvailableToElementId}},
+        {"CIM_ElementCapabilities", {IPElementCapabilitiesId}},
+        {"CIM_HostedService", {IPHostedServiceId}},
+        {"CIM_ServiceAffectsElement", {IPServiceAffectsElementId}},
+    };
+    bool appended = false;
+    const std::string ns = orEmpty(nameSpace);
+    for (const Parent& parent : parents) {
+        if (!ProviderUtilities::areClassesRelated(broker, ns, className, parent.name)) continue;
+        if (parent.ids.front() == IPHostedAccessPointId) {
+            NX_VAR(loggerIPInterfaceProvider, "0x48", 72u);
+            NX_VAR(loggerIPInterfaceProvider, "0x78", 120u);
+            NX_VAR(loggerIPInterfaceProvider, "0x50", 80u);
+        }
+        ids.insert(ids.end(), parent.ids.begin(), parent.ids.end());
+        appended = true;
+    }
+    return appended;
+}
+
+CMPIStatus IPInterface_Cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    return status;
+}
+
+CMPIStatus IPInterface_AssociationCleanup(CMPIAssociationMI*, const CMPIContext*, CMPIBoolean) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    return status;
+}
+
+CMPIStatus IPInterface_MethodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBoolean) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    return status;
+}
+
+CMPIStatus IPInterface_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
+                                         const CMPIObjectPath* cop) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(cop);
+        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
+        bool served = withInstanceAdapter(classId, ctx, cop, [&](auto& adapter) {
+            while (adapter) {
+                returnObjectPath(rslt, adapter.getObjectPath());
+                ++adapter;
+            }
+            CMReturnDone(rslt);
+        });
+        if (!served) status.rc = CMPI_RC_ERR_INVALID_CLASS;
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    EXIT_MARK();
+    return status;
+}
+
+CMPIStatus IPInterface_EnumInstances(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
+                                     const CMPIObjectPath* cop, const char** properties) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(cop);
+        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
+        bool served = withInstanceAdapter(classId, ctx, cop, [&](auto& adapter) {
+            while (adapter) {
+                returnInstance(rslt, adapter.getCMPIInstance(properties));
+                ++adapter;
+            }
+            CMReturnDone(rslt);
+        });
+        if (!served) status.rc = CMPI_RC_ERR_INVALID_CLASS;
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    EXIT_MARK();
+    return status;
+}
+
+CMPIStatus IPInterface_GetInstance(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
+                                   const CMPIObjectPath* cop, const char** properties) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(cop);
+        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
+        if (classId == IPElementCapabilitiesId) {
+            status.rc = CMPI_RC_ERR_NOT_SUPPORTED;
+        } else {
+            // A path that leaves keys out gets every matching instance; one that matches nothing
+            // gets none, and still rc 0.
+            bool served = withInstanceAdapter(classId, ctx, cop, [&](auto& adapter) {
+                while (adapter) {
+                    returnInstance(rslt, adapter.getCMPIInstance(properties));
+                    ++adapter;
+                }
+                CMReturnDone(rslt);
+            });
+            if (!served) status.rc = CMPI_RC_ERR_INVALID_CLASS;
+        }
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    EXIT_MARK();
+    return status;
+}
+
+CMPIStatus IPInterface_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
+                                      const CMPIInstance*) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+    EXIT_MARK();
+    return status;
+}
+
+CMPIStatus IPInterface_ModifyInstance(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
+                                      const CMPIObjectPath* cop, const CMPIInstance* ci, const char**) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(cop);
+        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
+        bool served = withModifiableAdapter(classId, ctx, cop, [&](auto& adapter) {
+            NX_VAR(loggerIPInterfaceProvider, "objectPath", ProviderUtilities::toString(broker, cop).c_str());
+            if (adapter) status = adapter.modifyInstance(ci);
+            CMReturnDone(rslt);
+        });
+        if (!served) status.rc = CMPI_RC_ERR_NOT_SUPPORTED;
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    EXIT_MARK();
+    return status;
+}
+
+CMPIStatus IPInterface_DeleteInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*) {
+    NX_METHOD(loggerIPInterfaceProvider);
+    CMPIStatus status = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+    return status;
+}
+
+CMPIStatus IPInterface_ExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
+                                 const char*, const char*) {
+    NX_METHOD(loggerIPInterfaceProvider);
+    CMPIStatus status = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
+    return status;
+}
+
+CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext*, const CMPIResult* rslt,
+                                  const CMPIObjectPath*, const char* resultClass, const char*, const char**) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(resultClass);
+        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
+        NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
+        if (!isServedAssociation(classId)) {
+            status.rc = CMPI_RC_ERR_INVALID_CLASS;
+        } else {
+            CMReturnDone(rslt);
+        }
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    EXIT_MARK();
+    return status;
+}
+
+CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext*, const CMPIResult* rslt,
+                                      const CMPIObjectPath*, const char* resultClass, const char*) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(resultClass);
+        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
+        NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
+        if (!isServedAssociation(classId)) {
+            status.rc = CMPI_RC_ERR_INVALID_CLASS;
+        } else {
+            CMReturnDone(rslt);
+        }
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    EXIT_MARK();
+    return status;
+}
+
+namespace {
+
+// The shared walk of associators and associator names over the identifiers the association class
+// expands to. An association class the provider does not know gives success and no results.
+template <class PerId>
+CMPIStatus associatorWalk(const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
+                          const CMPIResult* rslt, PerId&& perId) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
+    NX_VAR(loggerIPInterfaceProvider, "associationClass", orEmpty(assocClass));
+    std::vector<unsigned short> ids;
+    if (!getClassId(assocClass, ProviderUtilities::getNamespace(cop).c_str(), ids)) {
+        NX_VAR(loggerIPInterfaceProvider, "CMPI_RC_ERR_INVALID_CLASS", static_cast<unsigned>(CMPI_RC_ERR_INVALID_CLASS));
+    }
+    for (unsigned short id : ids) {
+        if (!isServedAssociation(id)) {
+            status.rc = CMPI_RC_ERR_INVALID_CLASS;
+        } else {
+            perId(id);
+        }
+        NX_VAR(loggerIPInterfaceProvider, "rcode", static_cast<unsigned>(status.rc));
+    }
+    CMReturnDone(rslt);
+    return status;
+}
+
+}  // namespace
+
+CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext*, const CMPIResult* rslt,
+                                   const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
+                                   const char*, const char*, const char**) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        status = associatorWalk(cop, assocClass, resultClass, rslt, [&](unsigned short) {});
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    EXIT_MARK();
+    return status;
+}
+
+CMPIStatus IPInterface_AssociatorNames(CMPIAssociationMI*, const CMPIContext*, const CMPIResult* rslt,
+                                       const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
+                                       const char*, const char*) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        status = associatorWalk(cop, assocClass, resultClass, rslt, [&](unsigned short) {});
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    EXIT_MARK();
+    return status;
+}
+
+CMPIStatus IPInterface_InvokeMethod(CMPIMethodMI*, const CMPIContext* ctx, const CMPIResult* rslt,
+                                    const CMPIObjectPath* cop, const char* method, const CMPIArgs* in,
+                                    CMPIArgs* out) {
+    ENTRY_MARK();
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    CMPIUint32 ret = 0;
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(cop);
+        if (classId == IPProtocolEndpointId) {
+            CMPIProtocolEndpoint endpoint(broker, ctx, cop);
+            if (endpoint) {
+                if (method && std::strcmp(method, "RequestStateChange") == 0) {
+                    ret = endpoint.executeMethod(in, out, &status);
+                    NX_VAR(loggerIPInterfaceProvider, "ret", static_cast<unsigned>(ret));
+                } else {
+                    status.rc = CMPI_RC_ERR_METHOD_NOT_FOUND;
+                    ret = CMPI_RC_ERR_METHOD_NOT_FOUND;
+                }
+            }
+        } else {
+            status.rc = CMPI_RC_ERR_INVALID_CLASS;
+            ret = CMPI_RC_ERR_INVALID_CLASS;
+        }
+    } catch (const std::exception& e) {
+        status.rc = CMPI_RC_ERR_FAILED;
+        status.msg = broker ? CMNewString(broker, e.what(), nullptr) : nullptr;
+    }
+    CMReturnData(rslt, &ret, CMPI_uint32);
+    CMReturnDone(rslt);
+    // No exit marker here: the method handler has always ended without one.
+    return status;
+}
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx
+
+using namespace Nx::IPInterfaceProvider;
+
+extern "C" {
+
+CMPIInstanceMI* IPInterfaceProvider_Create_InstanceMI(const CMPIBroker* brkr, const CMPIContext*, CMPIStatus*) {
+    static CMPIInstanceMI mi = {nullptr, &instMIFT__};
+    broker = brkr;
+    return &mi;
+}
+
+CMPIAssociationMI* IPInterfaceProvider_Create_AssociationMI(const CMPIBroker* brkr, const CMPIContext*, CMPIStatus*) {
+    static CMPIAssociationMI mi = {nullptr, &assocMIFT__};
+    broker = brkr;
+    return &mi;
+}
+
+CMPIMethodMI* IPInterfaceProvider_Create_MethodMI(const CMPIBroker* brkr, const CMPIContext*, CMPIStatus*) {
+    static CMPIMethodMI mi = {nullptr, &methMIFT__};
+    broker = brkr;
+    return &mi;
+}
+
+}

@@ -1,0 +1,746 @@
+// The host core: loading providers, routing requests to them, the public API.
+#include <dirent.h>
+#include <dlfcn.h>
+#include <pthread.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <thread>
+
+#include "Internal.h"
+
+#ifndef IPIF_DEFAULT_MOF_DIR
+#define IPIF_DEFAULT_MOF_DIR "mof"
+#endif
+#ifndef IPIF_DEFAULT_PROVIDER_DIR
+#define IPIF_DEFAULT_PROVIDER_DIR "."
+#endif
+
+namespace ipif {
+
+using namespace detail;
+
+namespace {
+
+const char* kindName(int kind) {
+    static const char* names[] = {"Instance", "Association", "Method"};
+    return names[kind];
+}
+
+std::vector<long> currentTasks() {
+    std::vector<long> tids;
+    if (DIR* dir = opendir("/proc/self/task")) {
+        while (dirent* e = readdir(dir))
+            if (e->d_name[0] != '.') tids.push_back(std::strtol(e->d_name, nullptr, 10));
+        closedir(dir);
+    }
+    std::sort(tids.begin(), tids.end());
+    return tids;
+}
+
+// Property lists as providers take them: NULL-terminated, or NULL for "all".
+class CharList {
+public:
+    explicit CharList(const std::vector<std::string>* list) {
+        if (!list) return;
+        for (const auto& s : *list) ptrs_.push_back(s.c_str());
+        ptrs_.push_back(nullptr);
+    }
+    const char** get() { return ptrs_.empty() ? nullptr : ptrs_.data(); }
+
+private:
+    std::vector<const char*> ptrs_;
+};
+
+const char* orNull(const std::string& s) { return s.empty() ? nullptr : s.c_str(); }
+
+// Calls into a provider; an exception escaping it becomes CMPI_RC_ERR_FAILED.
+template <class F>
+CMPIStatus callProvider(HostImpl* h, F&& f) {
+    try {
+        return f();
+    } catch (const std::exception& e) {
+        return status(h, CMPI_RC_ERR_FAILED, std::string("provider threw: ") + e.what());
+    } catch (...) {
+        return status(h, CMPI_RC_ERR_FAILED, "provider threw an exception");
+    }
+}
+
+Result failure(int rc, const std::string& message) {
+    Result r;
+    r.rc = rc;
+    r.message = message;
+    return r;
+}
+
+}  // namespace
+
+std::vector<std::string> HostOptions::splitList(const std::string& list) {
+    std::vector<std::string> out;
+    std::size_t start = 0;
+    while (start <= list.size()) {
+        std::size_t end = list.find(':', start);
+        if (end == std::string::npos) end = list.size();
+        if (end > start) out.push_back(list.substr(start, end - start));
+        start = end + 1;
+    }
+    return out;
+}
+
+struct Host::Impl::Provider {
+    std::string name;
+    std::string location;
+    std::recursive_mutex mutex;
+    void* handle = nullptr;
+    std::string loadError;
+    void* mi[3] = {nullptr, nullptr, nullptr};
+    bool tried[3] = {false, false, false};
+    bool creating[3] = {false, false, false};
+    std::string error[3];
+};
+
+Host::Impl::Impl(HostOptions o) : options(std::move(o)) {
+    broker.hdl = this;
+    broker.bft = &brokerFT;
+    broker.eft = &brokerEncFT;
+    broker.xft = &brokerExtFT;
+    broker.mft = &brokerMemFT;
+
+    std::vector<std::string> mofs = options.mofPaths;
+    if (mofs.empty()) {
+        const char* env = std::getenv("IPIF_MOF_DIR");
+        mofs.push_back(env && *env ? env : IPIF_DEFAULT_MOF_DIR);
+    }
+    for (const auto& m : mofs) repo.addPath(m);
+    repo.resolve();
+
+    std::vector<std::string> regPaths = options.regPaths;
+    if (regPaths.empty()) {
+        const char* env = std::getenv("IPIF_REG");
+        regPaths = env && *env ? HostOptions::splitList(env) : std::vector<std::string>{IPIF_DEFAULT_MOF_DIR};
+    }
+    for (const auto& p : regPaths) {
+        auto more = loadRegistrations(p);
+        regs.insert(regs.end(), more.begin(), more.end());
+    }
+    for (const auto& r : regs) {
+        bool known = std::any_of(providers_.begin(), providers_.end(), [&](const std::unique_ptr<Provider>& p) {
+            return p->name == r.providerName && p->location == r.location;
+        });
+        if (known) continue;
+        providers_.push_back(std::make_unique<Provider>());
+        providers_.back()->name = r.providerName;
+        providers_.back()->location = r.location;
+    }
+    baseline_ = currentTasks();
+}
+
+Host::Impl::~Impl() {
+    bool keepLoaded = false;
+    {
+        RequestScope scope(this);
+        for (auto& p : providers_) {
+            for (int k = 0; k < 3; ++k) {
+                if (!p->mi[k]) continue;
+                CMPIContext* ctx = nullptr;
+                try {
+                    ctx = newContext(options.defaultNamespace, nullptr);
+                } catch (...) {
+                    continue;
+                }
+                CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+                    switch (k) {
+                    case 0: {
+                        auto* mi = static_cast<CMPIInstanceMI*>(p->mi[k]);
+                        if (mi->ft && mi->ft->cleanup) return mi->ft->cleanup(mi, ctx, 1);
+                        break;
+                    }
+                    case 1: {
+                        auto* mi = static_cast<CMPIAssociationMI*>(p->mi[k]);
+                        if (mi->ft && mi->ft->cleanup) return mi->ft->cleanup(mi, ctx, 1);
+                        break;
+                    }
+                    default: {
+                        auto* mi = static_cast<CMPIMethodMI*>(p->mi[k]);
+                        if (mi->ft && mi->ft->cleanup) return mi->ft->cleanup(mi, ctx, 1);
+                    }
+                    }
+                    return okStatus();
+                });
+                if (st.rc == CMPI_RC_DO_NOT_UNLOAD || st.rc == CMPI_RC_NEVER_UNLOAD) keepLoaded = true;
+            }
+        }
+    }
+    // A provider thread still running would lose its code under it.
+    if (!keepLoaded && onlyBaselineThreads())
+        for (auto& p : providers_)
+            if (p->handle) dlclose(p->handle);
+    clones::releaseAll(this);
+    {
+        std::lock_guard<std::mutex> lock(framesMutex_);
+        attached_.clear();
+    }
+    hostArena_.clear();
+}
+
+Arena& Host::Impl::arena() {
+    Frame* f = currentFrame();
+    return f && f->host == this ? f->arena : hostArena_;
+}
+
+std::string Host::Impl::nameSpaceOf(const ObjectPath& path) const {
+    return path.nameSpace.empty() ? options.defaultNamespace : path.nameSpace;
+}
+
+CMPIContext* Host::Impl::newContext(const std::string& ns, const NamedValues* ctx) {
+    NamedValues entries = ctx ? *ctx : NamedValues();
+    entries.set(CMPIInitNameSpace, Value::string(ns));
+    if (!entries.find(CMPIInvocationFlags)) entries.set(CMPIInvocationFlags, Value::uint32(0));
+    return make<ContextObj>(this, std::move(entries));
+}
+
+void Host::Impl::attachThread() {
+    auto frame = std::make_unique<Frame>();
+    frame->host = this;
+    frame->depth = 1;
+    frame->previous = currentFrame();
+    currentFrame() = frame.get();
+    std::lock_guard<std::mutex> lock(framesMutex_);
+    attached_[static_cast<unsigned long>(pthread_self())] = std::move(frame);
+}
+
+bool Host::Impl::detachThread() {
+    std::unique_ptr<Frame> frame;
+    {
+        std::lock_guard<std::mutex> lock(framesMutex_);
+        auto it = attached_.find(static_cast<unsigned long>(pthread_self()));
+        if (it == attached_.end() || currentFrame() != it->second.get()) return false;
+        frame = std::move(it->second);
+        attached_.erase(it);
+    }
+    currentFrame() = frame->previous;
+    return true;
+}
+
+bool Host::Impl::onlyBaselineThreads() const {
+    for (long tid : currentTasks())
+        if (!std::binary_search(baseline_.begin(), baseline_.end(), tid)) return false;
+    return true;
+}
+
+bool Host::Impl::waitForThreads(std::chrono::milliseconds timeout) {
+    auto deadline = std::chrono::steady_clock::now() + timeout;
+    while (true) {
+        if (onlyBaselineThreads()) return true;
+        if (std::chrono::steady_clock::now() >= deadline) return false;
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+}
+
+Host::Impl::Provider* Host::Impl::providerOf(const Registration& r) {
+    for (auto& p : providers_)
+        if (p->name == r.providerName && p->location == r.location) return p.get();
+    return nullptr;
+}
+
+void* Host::Impl::miFor(Provider& p, Kind kind, std::string& error) {
+    int k = static_cast<int>(kind);
+    std::lock_guard<std::recursive_mutex> lock(p.mutex);
+    if (p.mi[k]) return p.mi[k];
+    if (p.tried[k]) {
+        error = p.error[k];
+        return nullptr;
+    }
+    if (p.creating[k]) {
+        error = "provider " + p.name + " is still starting";
+        return nullptr;
+    }
+    if (!p.handle) {
+        if (!p.loadError.empty()) {
+            error = p.loadError;
+            return nullptr;
+        }
+        std::string file = "lib" + p.location + ".so";
+        std::vector<std::string> dirs = options.providerDirs;
+        if (const char* env = std::getenv("IPIF_PROVIDER_PATH")) {
+            auto more = HostOptions::splitList(env);
+            dirs.insert(dirs.end(), more.begin(), more.end());
+        }
+        dirs.push_back(IPIF_DEFAULT_PROVIDER_DIR);
+        for (const auto& d : dirs) {
+            std::string path = d + "/" + file;
+            if (access(path.c_str(), F_OK) != 0) continue;
+            p.handle = dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL);
+            if (!p.handle) {
+                const char* e = dlerror();
+                p.loadError = "cannot load provider library " + path + ": " + (e ? e : "unknown error");
+            }
+            break;
+        }
+        if (!p.handle && p.loadError.empty()) {
+            p.handle = dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
+            if (!p.handle) {
+                const char* e = dlerror();
+                p.loadError = "cannot find provider library " + file + ": " + (e ? e : "unknown error");
+            }
+        }
+        if (!p.handle) {
+            error = p.loadError;
+            return nullptr;
+        }
+    }
+    p.creating[k] = true;
+    std::string generic = std::string("_Generic_Create_") + kindName(k) + "MI";
+    std::string specific = p.name + "_Create_" + kindName(k) + "MI";
+    void* genericSym = dlsym(p.handle, generic.c_str());
+    void* specificSym = genericSym ? nullptr : dlsym(p.handle, specific.c_str());
+    void* mi = nullptr;
+    CMPIStatus st = okStatus();
+    if (genericSym || specificSym) {
+        CMPIContext* ctx = newContext(options.defaultNamespace, nullptr);
+        CMPIStatus thrown = callProvider(this, [&]() -> CMPIStatus {
+            using Generic = void* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
+            using Specific = void* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+            if (genericSym)
+                mi = reinterpret_cast<Generic>(genericSym)(&broker, ctx, p.name.c_str(), &st);
+            else
+                mi = reinterpret_cast<Specific>(specificSym)(&broker, ctx, &st);
+            return okStatus();
+        });
+        if (thrown.rc != CMPI_RC_OK) st = thrown;
+    }
+    p.creating[k] = false;
+    p.tried[k] = true;
+    if (!genericSym && !specificSym) {
+        p.error[k] = "provider library lib" + p.location + ".so has no " + specific;
+    } else if (!mi || st.rc != CMPI_RC_OK) {
+        std::string text = statusText(st);
+        p.error[k] = specific + " failed (rc " + std::to_string(st.rc) + (text.empty() ? "" : ": " + text) + ")";
+        mi = nullptr;
+    }
+    if (!mi) {
+        error = p.error[k];
+        return nullptr;
+    }
+    p.mi[k] = mi;
+    return mi;
+}
+
+const Registration* Host::Impl::registrationFor(const std::string& ns, const std::string& cls, Kind kind) const {
+    std::vector<std::string> chain = repo.ancestry(cls);
+    if (chain.empty()) chain.push_back(cls);
+    for (const auto& c : chain)
+        for (const auto& r : regs) {
+            bool serves = kind == Kind::Instance ? r.instance : kind == Kind::Association ? r.association : r.method;
+            if (serves && equalsIgnoreCase(r.className, c) && r.servesNamespace(ns)) return &r;
+        }
+    return nullptr;
+}
+
+void Host::Impl::finish(Result& r, Collector& c, const CMPIStatus& st) {
+    for (auto& i : c.instances) r.instances.push_back(std::move(i));
+    for (auto& p : c.paths) r.paths.push_back(std::move(p));
+    r.done = r.done || c.done;
+    if (st.rc != CMPI_RC_OK && r.rc == 0) {
+        r.rc = st.rc;
+        r.message = statusText(st);
+    }
+}
+
+Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std::vector<std::string>* props,
+                             const NamedValues* ctx) {
+    std::string ns = nameSpaceOf(classPath);
+    if (!repo.exists(classPath.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + classPath.className);
+    std::vector<const Registration*> targets;
+    for (const auto& r : regs) {
+        if (!r.instance || !r.servesNamespace(ns) || !repo.isA(r.className, classPath.className)) continue;
+        bool seen = std::any_of(targets.begin(), targets.end(),
+                                [&](const Registration* t) { return equalsIgnoreCase(t->className, r.className); });
+        if (!seen) targets.push_back(&r);
+    }
+    Result result;
+    for (const Registration* reg : targets) {
+        std::string error;
+        auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
+        if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+        Collector col;
+        col.nameSpace = ns;
+        CMPIContext* cctx = newContext(ns, ctx);
+        ResultObj* res = make<ResultObj>(this, &col);
+        PathObj* cop = make<PathObj>(this, ObjectPath(ns, repo.find(reg->className)->name));
+        CharList pl(props);
+        CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+            if (!mi->ft) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "provider has no function table");
+            if (names) {
+                if (!mi->ft->enumerateInstanceNames) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+                return mi->ft->enumerateInstanceNames(mi, cctx, res, cop);
+            }
+            if (!mi->ft->enumerateInstances) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+            return mi->ft->enumerateInstances(mi, cctx, res, cop, pl.get());
+        });
+        res->sink = nullptr;
+        finish(result, col, st);
+        if (!result.ok()) break;
+    }
+    return result;
+}
+
+Result Host::Impl::get(const ObjectPath& path, const std::vector<std::string>* props, const NamedValues* ctx) {
+    std::string ns = nameSpaceOf(path);
+    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
+    const Registration* reg = registrationFor(ns, path.className, Kind::Instance);
+    if (!reg) return failure(CMPI_RC_ERR_NOT_FOUND, "no instance provider for " + path.className + " in " + ns);
+    std::string error;
+    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
+    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+    Collector col;
+    col.nameSpace = ns;
+    CMPIContext* cctx = newContext(ns, ctx);
+    ResultObj* res = make<ResultObj>(this, &col);
+    ObjectPath full = path;
+    full.nameSpace = ns;
+    PathObj* cop = make<PathObj>(this, full);
+    CharList pl(props);
+    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+        if (!mi->ft || !mi->ft->getInstance) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+        return mi->ft->getInstance(mi, cctx, res, cop, pl.get());
+    });
+    res->sink = nullptr;
+    Result result;
+    finish(result, col, st);
+    return result;
+}
+
+Result Host::Impl::modify(const ObjectPath& path, const Instance& inst, const std::vector<std::string>* props,
+                          const NamedValues* ctx) {
+    std::string ns = nameSpaceOf(path);
+    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
+    const Registration* reg = registrationFor(ns, path.className, Kind::Instance);
+    if (!reg) return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no instance provider for " + path.className + " in " + ns);
+    std::string error;
+    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
+    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+    Collector col;
+    col.nameSpace = ns;
+    CMPIContext* cctx = newContext(ns, ctx);
+    ResultObj* res = make<ResultObj>(this, &col);
+    ObjectPath full = path;
+    full.nameSpace = ns;
+    PathObj* cop = make<PathObj>(this, full);
+    Instance copy = inst;
+    copy.path = full;
+    InstanceObj* ci = make<InstanceObj>(this, std::move(copy));
+    CharList pl(props);
+    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+        if (!mi->ft || !mi->ft->modifyInstance) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+        return mi->ft->modifyInstance(mi, cctx, res, cop, ci, pl.get());
+    });
+    res->sink = nullptr;
+    Result result;
+    finish(result, col, st);
+    return result;
+}
+
+Result Host::Impl::create(const ObjectPath& path, const Instance& inst, const NamedValues* ctx) {
+    std::string ns = nameSpaceOf(path);
+    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
+    const Registration* reg = registrationFor(ns, path.className, Kind::Instance);
+    if (!reg) return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no instance provider for " + path.className + " in " + ns);
+    std::string error;
+    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
+    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+    Collector col;
+    col.nameSpace = ns;
+    CMPIContext* cctx = newContext(ns, ctx);
+    ResultObj* res = make<ResultObj>(this, &col);
+    ObjectPath full = path;
+    full.nameSpace = ns;
+    PathObj* cop = make<PathObj>(this, full);
+    Instance copy = inst;
+    copy.path = full;
+    InstanceObj* ci = make<InstanceObj>(this, std::move(copy));
+    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+        if (!mi->ft || !mi->ft->createInstance) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+        return mi->ft->createInstance(mi, cctx, res, cop, ci);
+    });
+    res->sink = nullptr;
+    Result result;
+    finish(result, col, st);
+    return result;
+}
+
+Result Host::Impl::remove(const ObjectPath& path, const NamedValues* ctx) {
+    std::string ns = nameSpaceOf(path);
+    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
+    const Registration* reg = registrationFor(ns, path.className, Kind::Instance);
+    if (!reg) return failure(CMPI_RC_ERR_NOT_FOUND, "no instance provider for " + path.className + " in " + ns);
+    std::string error;
+    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
+    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+    Collector col;
+    col.nameSpace = ns;
+    CMPIContext* cctx = newContext(ns, ctx);
+    ResultObj* res = make<ResultObj>(this, &col);
+    ObjectPath full = path;
+    full.nameSpace = ns;
+    PathObj* cop = make<PathObj>(this, full);
+    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+        if (!mi->ft || !mi->ft->deleteInstance) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+        return mi->ft->deleteInstance(mi, cctx, res, cop);
+    });
+    res->sink = nullptr;
+    Result result;
+    finish(result, col, st);
+    return result;
+}
+
+Result Host::Impl::query(const ObjectPath& classPath, const std::string& queryText, const std::string& language,
+                         const NamedValues* ctx) {
+    std::string ns = nameSpaceOf(classPath);
+    if (!repo.exists(classPath.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + classPath.className);
+    const Registration* reg = registrationFor(ns, classPath.className, Kind::Instance);
+    if (!reg) return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no instance provider for " + classPath.className + " in " + ns);
+    std::string error;
+    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
+    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+    Collector col;
+    col.nameSpace = ns;
+    CMPIContext* cctx = newContext(ns, ctx);
+    ResultObj* res = make<ResultObj>(this, &col);
+    PathObj* cop = make<PathObj>(this, ObjectPath(ns, classPath.className));
+    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+        if (!mi->ft || !mi->ft->execQuery) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+        return mi->ft->execQuery(mi, cctx, res, cop, queryText.c_str(), orNull(language));
+    });
+    res->sink = nullptr;
+    Result result;
+    finish(result, col, st);
+    return result;
+}
+
+Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& assocClass,
+                         const std::string& resultClass, const std::string& role, const std::string& resultRole,
+                         const std::vector<std::string>* props, const NamedValues* ctx) {
+    std::string ns = nameSpaceOf(path);
+    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
+    bool associators = op == AssocOp::Associators || op == AssocOp::AssociatorNames;
+    const std::string& filter = associators ? assocClass : resultClass;
+    bool knownFilter = !filter.empty() && repo.exists(filter);
+
+    // Association classes of this namespace that can hold the source object.
+    auto canHoldSource = [&](const std::string& assocCls) {
+        if (!repo.exists(assocCls)) return true;
+        for (const auto& p : repo.properties(assocCls)) {
+            if (p.type != CimType::Reference) continue;
+            if (!role.empty() && !equalsIgnoreCase(p.name, role)) continue;
+            if (repo.isA(path.className, p.refClass) || repo.isA(p.refClass, path.className)) return true;
+        }
+        return false;
+    };
+    std::vector<std::pair<Provider*, std::vector<std::string>>> groups;
+    for (const auto& r : regs) {
+        if (!r.association || !r.servesNamespace(ns)) continue;
+        if (knownFilter && !repo.isA(r.className, filter)) continue;
+        if (!canHoldSource(r.className)) continue;
+        Provider* p = providerOf(r);
+        auto g = std::find_if(groups.begin(), groups.end(), [&](const auto& e) { return e.first == p; });
+        if (g == groups.end()) {
+            groups.emplace_back(p, std::vector<std::string>{});
+            g = groups.end() - 1;
+        }
+        if (std::none_of(g->second.begin(), g->second.end(),
+                         [&](const std::string& c) { return equalsIgnoreCase(c, r.className); }))
+            g->second.push_back(r.className);
+    }
+
+    ObjectPath full = path;
+    full.nameSpace = ns;
+    Result result;
+    for (auto& group : groups) {
+        std::string error;
+        auto* mi = static_cast<CMPIAssociationMI*>(miFor(*group.first, Kind::Association, error));
+        if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+        std::vector<std::string> filters = filter.empty() ? group.second : std::vector<std::string>{filter};
+        for (const auto& f : filters) {
+            Collector col;
+            col.nameSpace = ns;
+            CMPIContext* cctx = newContext(ns, ctx);
+            ResultObj* res = make<ResultObj>(this, &col);
+            PathObj* cop = make<PathObj>(this, full);
+            CharList pl(props);
+            CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+                if (!mi->ft) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "provider has no function table");
+                switch (op) {
+                case AssocOp::Associators:
+                    if (!mi->ft->associators) break;
+                    return mi->ft->associators(mi, cctx, res, cop, f.c_str(), orNull(resultClass), orNull(role),
+                                               orNull(resultRole), pl.get());
+                case AssocOp::AssociatorNames:
+                    if (!mi->ft->associatorNames) break;
+                    return mi->ft->associatorNames(mi, cctx, res, cop, f.c_str(), orNull(resultClass), orNull(role),
+                                                   orNull(resultRole));
+                case AssocOp::References:
+                    if (!mi->ft->references) break;
+                    return mi->ft->references(mi, cctx, res, cop, f.c_str(), orNull(role), pl.get());
+                case AssocOp::ReferenceNames:
+                    if (!mi->ft->referenceNames) break;
+                    return mi->ft->referenceNames(mi, cctx, res, cop, f.c_str(), orNull(role));
+                }
+                return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+            });
+            res->sink = nullptr;
+            finish(result, col, st);
+            if (!result.ok()) return result;
+        }
+    }
+    return result;
+}
+
+Result Host::Impl::invoke(const ObjectPath& path, const std::string& method, const Args& in, const NamedValues* ctx) {
+    std::string ns = nameSpaceOf(path);
+    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
+    const Registration* reg = registrationFor(ns, path.className, Kind::Method);
+    if (!reg) return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no method provider for " + path.className + " in " + ns);
+    std::string error;
+    auto* mi = static_cast<CMPIMethodMI*>(miFor(*providerOf(*reg), Kind::Method, error));
+    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+    Collector col;
+    col.nameSpace = ns;
+    CMPIContext* cctx = newContext(ns, ctx);
+    ResultObj* res = make<ResultObj>(this, &col);
+    ObjectPath full = path;
+    full.nameSpace = ns;
+    PathObj* cop = make<PathObj>(this, full);
+    ArgsObj* inArgs = make<ArgsObj>(this, in);
+    ArgsObj* outArgs = make<ArgsObj>(this, Args());
+    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
+        if (!mi->ft || !mi->ft->invokeMethod) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
+        return mi->ft->invokeMethod(mi, cctx, res, cop, method.c_str(), inArgs, outArgs);
+    });
+    res->sink = nullptr;
+    Result result;
+    finish(result, col, st);
+    result.outArgs = outArgs->args;
+    if (!col.data.empty()) {
+        result.hasReturnValue = true;
+        result.returnValue = col.data.front();
+    }
+    return result;
+}
+
+// ---- Public API ----------------------------------------------------------------------------
+
+namespace {
+template <class F>
+Result run(Host::Impl* impl, F&& f) {
+    try {
+        RequestScope scope(impl);
+        return f();
+    } catch (const CimError& e) {
+        return failure(e.rc(), e.what());
+    } catch (const ParseError& e) {
+        return failure(CMPI_RC_ERR_INVALID_PARAMETER, e.what());
+    } catch (const std::exception& e) {
+        return failure(CMPI_RC_ERR_FAILED, e.what());
+    }
+}
+}  // namespace
+
+Host::Host(HostOptions options) : impl_(std::make_unique<Impl>(std::move(options))) {}
+Host::~Host() = default;
+
+const ClassRepository& Host::classes() const { return impl_->repo; }
+const std::vector<Registration>& Host::registrations() const { return impl_->regs; }
+const HostOptions& Host::options() const { return impl_->options; }
+const _CMPIBroker* Host::broker() const { return &impl_->broker; }
+
+HostStats Host::stats() const {
+    HostStats s;
+    s.liveObjects = impl_->liveObjects.load();
+    s.liveClones = impl_->liveClones.load();
+    return s;
+}
+
+ObjectPath Host::parsePath(const std::string& text) const {
+    ObjectPath p = ObjectPath::parse(text);
+    if (p.nameSpace.empty()) p.nameSpace = impl_->options.defaultNamespace;
+    return impl_->repo.typedPath(p);
+}
+
+namespace {
+ObjectPath typed(Host::Impl* impl, const ObjectPath& path) {
+    ObjectPath p = impl->repo.typedPath(path);
+    if (p.nameSpace.empty()) p.nameSpace = impl->options.defaultNamespace;
+    return p;
+}
+}  // namespace
+
+Result Host::enumerateInstanceNames(const std::string& ns, const std::string& cls) {
+    return run(impl_.get(), [&] { return impl_->enumerate(ObjectPath(ns, cls), true, nullptr, nullptr); });
+}
+
+Result Host::enumerateInstances(const std::string& ns, const std::string& cls, const std::vector<std::string>* props) {
+    return run(impl_.get(), [&] { return impl_->enumerate(ObjectPath(ns, cls), false, props, nullptr); });
+}
+
+Result Host::getInstance(const ObjectPath& path, const std::vector<std::string>* props) {
+    return run(impl_.get(), [&] { return impl_->get(typed(impl_.get(), path), props, nullptr); });
+}
+
+Result Host::modifyInstance(const ObjectPath& path, const Instance& instance, const std::vector<std::string>* props) {
+    return run(impl_.get(), [&] { return impl_->modify(typed(impl_.get(), path), instance, props, nullptr); });
+}
+
+Result Host::createInstance(const ObjectPath& path, const Instance& instance) {
+    return run(impl_.get(), [&] { return impl_->create(typed(impl_.get(), path), instance, nullptr); });
+}
+
+Result Host::deleteInstance(const ObjectPath& path) {
+    return run(impl_.get(), [&] { return impl_->remove(typed(impl_.get(), path), nullptr); });
+}
+
+Result Host::execQuery(const std::string& ns, const std::string& cls, const std::string& query,
+                       const std::string& language) {
+    return run(impl_.get(), [&] { return impl_->query(ObjectPath(ns, cls), query, language, nullptr); });
+}
+
+Result Host::associators(const ObjectPath& path, const std::string& assocClass, const std::string& resultClass,
+                         const std::string& role, const std::string& resultRole,
+                         const std::vector<std::string>* props) {
+    return run(impl_.get(), [&] {
+        return impl_->assoc(Impl::AssocOp::Associators, typed(impl_.get(), path), assocClass, resultClass, role,
+                            resultRole, props, nullptr);
+    });
+}
+
+Result Host::associatorNames(const ObjectPath& path, const std::string& assocClass, const std::string& resultClass,
+                             const std::string& role, const std::string& resultRole) {
+    return run(impl_.get(), [&] {
+        return impl_->assoc(Impl::AssocOp::AssociatorNames, typed(impl_.get(), path), assocClass, resultClass, role,
+                            resultRole, nullptr, nullptr);
+    });
+}
+
+Result Host::references(const ObjectPath& path, const std::string& resultClass, const std::string& role,
+                        const std::vector<std::string>* props) {
+    return run(impl_.get(), [&] {
+        return impl_->assoc(Impl::AssocOp::References, typed(impl_.get(), path), "", resultClass, role, "", props,
+                            nullptr);
+    });
+}
+
+Result Host::referenceNames(const ObjectPath& path, const std::string& resultClass, const std::string& role) {
+    return run(impl_.get(), [&] {
+        return impl_->assoc(Impl::AssocOp::ReferenceNames, typed(impl_.get(), path), "", resultClass, role, "",
+                            nullptr, nullptr);
+    });
+}
+
+Result Host::invokeMethod(const ObjectPath& path, const std::string& method, const Args& in) {
+    return run(impl_.get(), [&] { return impl_->invoke(typed(impl_.get(), path), method, in, nullptr); });
+}
+
+bool Host::waitForProviderThreads(std::chrono::milliseconds timeout) { return impl_->waitForThreads(timeout); }
+
+}  // namespace ipif

@@ -1,0 +1,70 @@
+// The host model: the machine as a tree of typed nodes with numbered properties, and the
+// backends that supply it (a fixture file, or the live Linux host).
+#pragma once
+
+#include <map>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace Nx {
+namespace HostModel {
+
+struct PropertyValue {
+    enum class Kind { String, Unsigned, StringList };
+    Kind kind = Kind::String;
+    std::string text;
+    unsigned int number = 0;
+    std::vector<std::string> list;
+    bool readable = true;   // false: the host cannot report it, every read fails
+    bool readOnly = false;  // true: writes are refused and isPropertyReadOnly says so
+
+    static PropertyValue ofText(std::string v);
+    static PropertyValue ofNumber(unsigned int v);
+    static PropertyValue ofList(std::vector<std::string> v);
+};
+
+struct Node {
+    unsigned int type = 0;
+    std::string name;         // unique among its siblings
+    std::string description;
+    std::string path;         // "/" + the names from the root down, joined by "/"
+    int parent = -1;          // index into Tree::nodes; -1 for the root
+    std::map<unsigned int, PropertyValue> properties;
+};
+
+// An immutable picture of the host. Nodes are in document order (a parent before its children,
+// siblings in order), which is the order in which a cursor walks the nodes of one type.
+struct Tree {
+    std::vector<Node> nodes;
+
+    int find(const std::string& path) const;  // index of the node at path, -1 when none
+    // Appends a node under parent (-1 for the root) and fills its path; returns its index.
+    int add(int parent, unsigned int type, const std::string& name, const std::string& description);
+};
+
+class Backend {
+public:
+    virtual ~Backend() = default;
+    // A consistent picture of the host. Cheap to call repeatedly; a picture handed out never changes.
+    virtual std::shared_ptr<const Tree> snapshot() = 0;
+    // Carries out a property write on the host. False when the node or property is unknown, the
+    // property is read-only, the value has the wrong kind, or the host refused the change.
+    // Snapshots taken after a successful write show the new value.
+    virtual bool write(const std::string& nodePath, unsigned int property, const PropertyValue& value) = 0;
+    // "fixture:<path>" or "live", for diagnostics.
+    virtual std::string describe() const = 0;
+};
+
+// Opens a backend from a selector: "fixture:PATH" or "live". Throws Nx::InstrumentationException
+// with a readable message when the selector or the fixture file is bad.
+std::shared_ptr<Backend> open(const std::string& selector);
+
+// The backend this process uses, chosen once from IPIF_HOST_MODEL (default "live").
+std::shared_ptr<Backend> current();
+
+// Replaces the process's backend (tests, embedded hosts). nullptr returns to the environment's choice.
+void setCurrent(std::shared_ptr<Backend> backend);
+
+}  // namespace HostModel
+}  // namespace Nx

@@ -1,0 +1,251 @@
+#include "HostFiles.h"
+
+#include <cerrno>
+#include <cstring>
+#include <dirent.h>
+#include <fstream>
+#include <sstream>
+#include <sys/inotify.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace Nx {
+namespace Live {
+
+namespace {
+
+const char* const kBlanks = " \t\r";
+
+std::vector<std::string> splitLines(const std::string& content) {
+    std::vector<std::string> lines;
+    std::size_t start = 0;
+    while (start < content.size()) {
+        std::size_t end = content.find('\n', start);
+        if (end == std::string::npos) end = content.size();
+        lines.push_back(content.substr(start, end - start));
+        start = end + 1;
+    }
+    return lines;
+}
+
+std::string joinLines(const std::vector<std::string>& lines) {
+    std::string content;
+    for (const std::string& line : lines) content += line + "\n";
+    return content;
+}
+
+std::vector<std::string> words(const std::string& line) {
+    std::vector<std::string> result;
+    std::istringstream in(line);
+    for (std::string word; in >> word;) result.push_back(word);
+    return result;
+}
+
+// The key a KEY=value line assigns, empty for comments and other lines.
+std::string assignedKey(const std::string& line) {
+    const std::size_t start = line.find_first_not_of(kBlanks);
+    if (start == std::string::npos || line[start] == '#') return std::string();
+    const std::size_t equals = line.find('=', start);
+    if (equals == std::string::npos) return std::string();
+    const std::string key = line.substr(start, equals - start);
+    return key.find_first_of(kBlanks) == std::string::npos ? key : std::string();
+}
+
+// The resolver keyword a line starts with, for the lines we own.
+bool isOwnedResolverLine(const std::string& line) {
+    const std::vector<std::string> w = words(line);
+    return !w.empty() && (w[0] == "nameserver" || w[0] == "search" || w[0] == "domain");
+}
+
+bool readSmallFile(const std::string& path, std::string& content) {
+    std::ifstream in(path, std::ios::binary);
+    if (!in) return false;
+    std::ostringstream buffer;
+    buffer << in.rdbuf();
+    content = buffer.str();
+    return true;
+}
+
+}  // namespace
+
+bool isSafeValue(const std::string& value) {
+    for (const char c : value) {
+        const bool alnum = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9');
+        if (!alnum && !std::strchr(".:-_/%,@+", c)) return false;
+    }
+    return true;
+}
+
+std::map<std::string, std::string> parseAssignments(const std::string& content) {
+    std::map<std::string, std::string> values;
+    for (const std::string& line : splitLines(content)) {
+        const std::string key = assignedKey(line);
+        if (key.empty()) continue;
+        std::string value = line.substr(line.find('=') + 1);
+        const std::size_t end = value.find_last_not_of(kBlanks);
+        value.erase(end == std::string::npos ? 0 : end + 1);
+        if (value.size() >= 2 && (value.front() == '"' || value.front() == '\'') && value.back() == value.front()) {
+            value = value.substr(1, value.size() - 2);
+        }
+        values[key] = value;
+    }
+    return values;
+}
+
+std::string assign(const std::string& content, const std::string& key, const std::string& value) {
+    std::vector<std::string> lines;
+    bool done = false;
+    for (std::string& line : splitLines(content)) {
+        if (assignedKey(line) != key) {
+            lines.push_back(std::move(line));
+        } else if (!done) {
+            if (!value.empty()) lines.push_back(key + "=" + value);
+            done = true;
+        }
+    }
+    if (!done && !value.empty()) lines.push_back(key + "=" + value);
+    return joinLines(lines);
+}
+
+ResolverConfig parseResolver(const std::string& content) {
+    ResolverConfig config;
+    for (const std::string& line : splitLines(content)) {
+        std::vector<std::string> w = words(line);
+        if (w.size() < 2) continue;
+        if (w[0] == "nameserver") {
+            config.nameServers.push_back(w[1]);
+        } else if (w[0] == "search") {
+            config.search.assign(w.begin() + 1, w.end());
+        } else if (w[0] == "domain") {
+            config.domain = w[1];
+        }
+    }
+    return config;
+}
+
+std::string rewriteResolver(const std::string& content, const ResolverConfig& config) {
+    std::vector<std::string> owned;
+    if (!config.domain.empty()) owned.push_back("domain " + config.domain);
+    if (!config.search.empty()) {
+        std::string line = "search";
+        for (const std::string& suffix : config.search) line += " " + suffix;
+        owned.push_back(line);
+    }
+    for (const std::string& server : config.nameServers) owned.push_back("nameserver " + server);
+
+    std::vector<std::string> lines;
+    std::size_t insertAt = std::string::npos;
+    for (std::string& line : splitLines(content)) {
+        if (isOwnedResolverLine(line)) {
+            if (insertAt == std::string::npos) insertAt = lines.size();
+        } else {
+            lines.push_back(std::move(line));
+        }
+    }
+    if (insertAt == std::string::npos) insertAt = lines.size();
+    lines.insert(lines.begin() + static_cast<std::ptrdiff_t>(insertAt), owned.begin(), owned.end());
+    return joinLines(lines);
+}
+
+std::map<std::string, std::string> readBootProtocols(const std::string& directory) {
+    std::map<std::string, std::string> result;
+    DIR* dir = ::opendir(directory.c_str());
+    if (!dir) return result;
+    while (const dirent* entry = ::readdir(dir)) {
+        const std::string name = entry->d_name;
+        if (name.compare(0, 6, "ifcfg-") != 0 || name.size() == 6) continue;
+        std::string content;
+        if (!readSmallFile(directory + "/" + name, content)) continue;
+        const std::map<std::string, std::string> values = parseAssignments(content);
+        const auto found = values.find("BOOTPROTO");
+        if (found != values.end()) result[name.substr(6)] = found->second;
+    }
+    ::closedir(dir);
+    return result;
+}
+
+bool makeDirectories(const std::string& path) {
+    struct stat info {};
+    if (::stat(path.c_str(), &info) == 0) return S_ISDIR(info.st_mode);
+    const std::size_t slash = path.find_last_of('/', path.size() > 1 ? path.size() - 2 : 0);
+    if (slash != std::string::npos && slash > 0 && !makeDirectories(path.substr(0, slash))) return false;
+    return ::mkdir(path.c_str(), 0755) == 0 || errno == EEXIST;
+}
+
+ChangeWatch::ChangeWatch() : fd_(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC)) {}
+
+ChangeWatch::~ChangeWatch() {
+    if (fd_ >= 0) ::close(fd_);
+}
+
+ChangeWatch::Stamp ChangeWatch::stamp(const std::string& path) {
+    Stamp s;
+    s.path = path;
+    struct stat info {};
+    if (::stat(path.c_str(), &info) == 0) {
+        s.exists = true;
+        s.seconds = info.st_mtim.tv_sec;
+        s.nanoseconds = info.st_mtim.tv_nsec;
+        s.inode = info.st_ino;
+        s.size = info.st_size;
+    }
+    return s;
+}
+
+void ChangeWatch::watch(const std::vector<std::string>& directories, const std::vector<std::string>& files) {
+    stamps_.clear();
+    if (fd_ < 0) {
+        for (const std::string& path : directories) stamps_.push_back(stamp(path));
+        for (const std::string& path : files) stamps_.push_back(stamp(path));
+        return;
+    }
+    for (auto it = watches_.begin(); it != watches_.end();) {
+        bool wanted = false;
+        for (const std::string& directory : directories) wanted = wanted || directory == it->first;
+        if (wanted) {
+            ++it;
+        } else {
+            ::inotify_rm_watch(fd_, it->second);
+            it = watches_.erase(it);
+        }
+    }
+    const std::uint32_t mask = IN_CREATE | IN_DELETE | IN_MODIFY | IN_CLOSE_WRITE | IN_MOVED_FROM | IN_MOVED_TO |
+                               IN_DELETE_SELF | IN_MOVE_SELF | IN_ONLYDIR;
+    for (const std::string& directory : directories) {
+        const int wd = ::inotify_add_watch(fd_, directory.c_str(), mask);
+        if (wd >= 0) {
+            watches_[directory] = wd;
+        } else {
+            watches_.erase(directory);
+            stamps_.push_back(stamp(directory));  // appears later: noticed by its stamp
+        }
+    }
+    changed();  // forget what happened before
+}
+
+bool ChangeWatch::changed() {
+    bool result = false;
+    if (fd_ >= 0) {
+        alignas(inotify_event) char buffer[4096];
+        for (;;) {
+            const ssize_t n = ::read(fd_, buffer, sizeof buffer);
+            if (n > 0) {
+                result = true;
+                continue;
+            }
+            if (n < 0 && errno == EINTR) continue;
+            break;
+        }
+    }
+    for (const Stamp& before : stamps_) {
+        const Stamp now = stamp(before.path);
+        if (now.exists != before.exists || now.seconds != before.seconds || now.nanoseconds != before.nanoseconds ||
+            now.inode != before.inode || now.size != before.size) {
+            result = true;
+        }
+    }
+    return result;
+}
+
+}  // namespace Live
+}  // namespace Nx

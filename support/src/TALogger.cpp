@@ -1,0 +1,137 @@
+#include "TALog/TALogger.h"
+
+#include <fcntl.h>
+#include <sys/syscall.h>
+#include <syslog.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <memory>
+#include <mutex>
+#include <string>
+
+namespace TALog {
+namespace {
+
+constexpr int kDefaultThreshold = 6000;
+
+// An append-only descriptor, closed when the last configuration using it goes away.
+class AppendFile {
+public:
+    explicit AppendFile(const char* path) : fd_(::open(path, O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0644)) {}
+    ~AppendFile() {
+        if (fd_ >= 0) ::close(fd_);
+    }
+    AppendFile(const AppendFile&) = delete;
+    AppendFile& operator=(const AppendFile&) = delete;
+
+    // One write(2) per line: with O_APPEND, lines from several threads and processes never interleave.
+    void writeLine(const std::string& line) const {
+        if (fd_ < 0) return;
+        const char* data = line.data();
+        size_t left = line.size();
+        while (left > 0) {
+            ssize_t n = ::write(fd_, data, left);
+            if (n < 0) {
+                if (errno == EINTR) continue;
+                return;
+            }
+            data += n;
+            left -= static_cast<size_t>(n);
+        }
+    }
+
+private:
+    int fd_;
+};
+
+struct Config {
+    int threshold = kDefaultThreshold;
+    std::unique_ptr<AppendFile> logFile;    // null: syslog
+    std::unique_ptr<AppendFile> traceFile;  // null: trace records are dropped
+};
+
+std::shared_ptr<const Config> readEnvironment() {
+    auto config = std::make_shared<Config>();
+    if (const char* level = std::getenv("IPIF_LOG_LEVEL"); level && *level) {
+        char* end = nullptr;
+        errno = 0;
+        long value = std::strtol(level, &end, 10);
+        if (errno == 0 && end && *end == '\0' && value >= -1000000 && value <= 1000000)
+            config->threshold = static_cast<int>(value);
+    }
+    if (const char* path = std::getenv("IPIF_LOG_FILE"); path && *path) config->logFile = std::make_unique<AppendFile>(path);
+    if (const char* path = std::getenv("IPIF_TRACE_FILE"); path && *path)
+        config->traceFile = std::make_unique<AppendFile>(path);
+    return config;
+}
+
+std::mutex configMutex;
+std::shared_ptr<const Config> configuration;
+
+std::shared_ptr<const Config> currentConfig() {
+    std::lock_guard<std::mutex> lock(configMutex);
+    if (!configuration) configuration = readEnvironment();
+    return configuration;
+}
+
+// A record is one line: embedded line breaks would let a value forge further records.
+std::string oneLine(const char* text) {
+    std::string line = text ? text : "";
+    for (char& c : line)
+        if (c == '\n' || c == '\r') c = ' ';
+    return line;
+}
+
+int syslogPriority(int level) {
+    if (level >= 6000) return LOG_ERR;
+    if (level >= 5000) return LOG_WARNING;
+    if (level >= 4000) return LOG_INFO;
+    return LOG_DEBUG;
+}
+
+void toSyslog(int level, const std::string& line) {
+    static std::once_flag opened;
+    std::call_once(opened, [] { ::openlog("ipif", LOG_PID | LOG_NDELAY, LOG_DAEMON); });
+    ::syslog(syslogPriority(level), "%s", line.c_str());
+}
+
+}  // namespace
+
+void TALogger::logLevelMessage(const char* /*function*/, const char* /*file*/, int /*line*/,
+                               const std::string& /*component*/, int level, const char*, int, int,
+                               const char* text) {
+    auto config = currentConfig();
+    if (level < config->threshold) return;
+    std::string line = oneLine(text);
+    if (config->logFile) {
+        line += '\n';
+        config->logFile->writeLine(line);
+    } else {
+        toSyslog(level, line);
+    }
+}
+
+void TALogger::traceLevelMessage(const char* function, const char* file, int line, const std::string& component,
+                                 int level, const char*, int, int, const char* text) {
+    auto config = currentConfig();
+    if (level < config->threshold || !config->traceFile) return;
+    char head[256];
+    std::snprintf(head, sizeof head, "%ld %ld %d %s %s %s:%d: ", static_cast<long>(::getpid()),
+                  static_cast<long>(::syscall(SYS_gettid)), level, component.c_str(), function ? function : "?",
+                  file ? file : "?", line);
+    std::string record = head;
+    record += oneLine(text);
+    record += '\n';
+    config->traceFile->writeLine(record);
+}
+
+void TALogger::reconfigure() {
+    auto fresh = readEnvironment();
+    std::lock_guard<std::mutex> lock(configMutex);
+    configuration = std::move(fresh);
+}
+
+}  // namespace TALog
