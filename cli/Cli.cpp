@@ -1,0 +1,489 @@
+#include "Cli.h"
+
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+#include <iostream>
+#include <memory>
+#include <sstream>
+
+#include "ipif/Host.h"
+
+namespace ipif {
+namespace cli {
+
+namespace {
+
+const char* kUsage =
+    "usage: ipif [options] COMMAND ARGUMENTS\n"
+    "\n"
+    "Commands (PATH is [namespace:]Class.Key=\"value\",...; CLASS is [namespace:]Class):\n"
+    "  ein CLASS                      enumerate instance names\n"
+    "  ei  CLASS                      enumerate instances\n"
+    "  gi  PATH                       get instance\n"
+    "  mi  PATH Prop=value ...        modify instance (the keys of PATH plus the given properties)\n"
+    "  ci  PATH Prop=value ...        create instance\n"
+    "  di  PATH                       delete instance\n"
+    "  eq  CLASS QUERY [LANGUAGE]     execute a query (language WQL by default)\n"
+    "  ai  PATH [-ac C] [-rc C] [-r R] [-rr R]   associators\n"
+    "  ain PATH [-ac C] [-rc C] [-r R] [-rr R]   associator names\n"
+    "  ri  PATH [-rc C] [-r R]        references (-rc: the association class)\n"
+    "  rin PATH [-rc C] [-r R]        reference names\n"
+    "  cm  PATH METHOD [Arg=value ...]  call a method\n"
+    "\n"
+    "Values are typed from the MOF: numbers, true/false, strings (quotes optional), datetimes\n"
+    "in CIM form (00000000000100.000000:000), references as paths, arrays comma-separated\n"
+    "(a quoted element may hold commas). Name:type=value forces a type (uint32, string, ref,\n"
+    "uint16[] ...), also for names the MOF does not declare.\n"
+    "\n"
+    "Options:\n"
+    "  --json               JSON output instead of MOF-style text\n"
+    "  --host-model SEL     host model for the providers (sets IPIF_HOST_MODEL, e.g. fixture:PATH)\n"
+    "  --mof PATH           MOF file or directory (repeatable, or colon-separated)\n"
+    "  --reg PATH           registration file or directory (repeatable, or colon-separated)\n"
+    "  --namespace NS       default namespace (root/cimv2)\n"
+    "  -ac, -rc, -r, -rr    association filters: assoc class, result class, role, result role\n"
+    "  -h, --help           this text\n"
+    "\n"
+    "Output: instances as 'instance of Class { Prop = value; };', paths one per line, and for\n"
+    "cm 'ReturnValue = N;' followed by one 'Name = value;' line per out argument.\n"
+    "Exit status: 0 ok, 1 command line rejected, 2 the request failed with a CMPI status.\n";
+
+// An error with its exit code; rc < 0 means a plain usage message.
+struct Failure {
+    int exitCode;
+    int rc;
+    std::string message;
+};
+
+[[noreturn]] void usage(const std::string& msg) { throw Failure{1, -1, msg + " (see ipif --help)"}; }
+[[noreturn]] void rejected(int rc, const std::string& msg) { throw Failure{1, rc, msg}; }
+
+struct Options {
+    bool json = false;
+    std::string hostModel;
+    bool hostModelSet = false;
+    std::vector<std::string> mofs;
+    std::vector<std::string> regs;
+    std::string nameSpace;
+    std::string assocClass, resultClass, role, resultRole;
+    std::vector<std::string> positional;
+    bool help = false;
+};
+
+Options parseOptions(const std::vector<std::string>& args) {
+    Options o;
+    bool endOfOptions = false;
+    for (std::size_t i = 0; i < args.size(); ++i) {
+        const std::string& a = args[i];
+        if (endOfOptions || a.empty() || a[0] != '-' || a == "-") {
+            o.positional.push_back(a);
+            continue;
+        }
+        auto value = [&](const std::string& name) -> std::string {
+            std::string prefix = name + "=";
+            if (a.compare(0, prefix.size(), prefix) == 0) return a.substr(prefix.size());
+            if (i + 1 >= args.size()) usage("option " + name + " needs a value");
+            return args[++i];
+        };
+        auto is = [&](const std::string& name) { return a == name || a.compare(0, name.size() + 1, name + "=") == 0; };
+        if (a == "--") {
+            endOfOptions = true;
+        } else if (a == "--json") {
+            o.json = true;
+        } else if (a == "-h" || a == "--help") {
+            o.help = true;
+        } else if (is("--host-model")) {
+            o.hostModel = value("--host-model");
+            o.hostModelSet = true;
+        } else if (is("--mof")) {
+            for (const auto& p : HostOptions::splitList(value("--mof"))) o.mofs.push_back(p);
+        } else if (is("--reg")) {
+            for (const auto& p : HostOptions::splitList(value("--reg"))) o.regs.push_back(p);
+        } else if (is("--namespace")) {
+            o.nameSpace = value("--namespace");
+        } else if (is("-ac")) {
+            o.assocClass = value("-ac");
+        } else if (is("-rc")) {
+            o.resultClass = value("-rc");
+        } else if (is("-rr")) {
+            o.resultRole = value("-rr");
+        } else if (is("-r")) {
+            o.role = value("-r");
+        } else {
+            usage("unknown option " + a);
+        }
+    }
+    return o;
+}
+
+// ---- Output --------------------------------------------------------------------------------
+
+std::string jsonString(const std::string& s) {
+    std::string out = "\"";
+    for (unsigned char c : s) {
+        switch (c) {
+        case '"': out += "\\\""; break;
+        case '\\': out += "\\\\"; break;
+        case '\n': out += "\\n"; break;
+        case '\t': out += "\\t"; break;
+        case '\r': out += "\\r"; break;
+        default:
+            if (c < 0x20) {
+                char buf[8];
+                std::snprintf(buf, sizeof buf, "\\u%04x", c);
+                out += buf;
+            } else {
+                out += static_cast<char>(c);
+            }
+        }
+    }
+    return out + "\"";
+}
+
+std::string jsonInstance(const Instance& inst);
+
+std::string jsonElement(CimType type, const Element& e) {
+    switch (e.index()) {
+    case 0: return "null";
+    case 1: return std::get<bool>(e) ? "true" : "false";
+    case 2: return std::to_string(std::get<std::uint64_t>(e));
+    case 3: return std::to_string(std::get<std::int64_t>(e));
+    case 4: {
+        double d = std::get<double>(e);
+        if (!std::isfinite(d)) return jsonString(Value::real64(d).toText());
+        char buf[64];
+        std::snprintf(buf, sizeof buf, type == CimType::Real32 ? "%.9g" : "%.17g", d);
+        return buf;
+    }
+    case 5: return jsonString(std::get<std::string>(e));
+    case 6: return jsonString(std::get<ObjectPathPtr>(e)->toString());
+    case 7: return jsonInstance(*std::get<InstancePtr>(e));
+    }
+    return "null";
+}
+
+std::string jsonValue(const Value& v) {
+    if (v.isNull()) return "null";
+    if (!v.isArray()) return v.elements().empty() ? "null" : jsonElement(v.type(), v.elements()[0]);
+    std::string out = "[";
+    for (std::size_t i = 0; i < v.elements().size(); ++i) {
+        if (i) out += ", ";
+        out += jsonElement(v.type(), v.elements()[i]);
+    }
+    return out + "]";
+}
+
+std::string jsonNamed(const NamedValues& values) {
+    std::string out = "{";
+    bool first = true;
+    for (const auto& p : values) {
+        out += first ? "" : ", ";
+        first = false;
+        out += jsonString(p.first) + ": " + jsonValue(p.second);
+    }
+    return out + "}";
+}
+
+std::string jsonInstance(const Instance& inst) {
+    return "{\"class\": " + jsonString(inst.className()) + ", \"path\": " + jsonString(inst.path.toString()) +
+           ", \"properties\": " + jsonNamed(inst.properties) + "}";
+}
+
+void printInstances(const std::vector<Instance>& instances, bool json, std::ostream& out) {
+    if (json) {
+        out << "[";
+        for (std::size_t i = 0; i < instances.size(); ++i) out << (i ? ",\n " : "") << jsonInstance(instances[i]);
+        out << "]\n";
+        return;
+    }
+    for (std::size_t i = 0; i < instances.size(); ++i) out << (i ? "\n" : "") << instances[i].toMof();
+}
+
+void printPaths(const std::vector<ObjectPath>& paths, bool json, std::ostream& out) {
+    if (json) {
+        out << "[";
+        for (std::size_t i = 0; i < paths.size(); ++i) out << (i ? ",\n " : "") << jsonString(paths[i].toString());
+        out << "]\n";
+        return;
+    }
+    for (const auto& p : paths) out << p.toString() << "\n";
+}
+
+// ---- Command arguments ---------------------------------------------------------------------
+
+ObjectPath classArgument(Host& host, const std::string& text) {
+    ObjectPath p;
+    try {
+        p = ObjectPath::parse(text);
+    } catch (const ParseError& e) {
+        rejected(4, e.what());
+    }
+    if (!p.keys.empty()) rejected(4, "expected a class name, not an instance path: " + text);
+    const ClassDecl* c = host.classes().find(p.className);
+    if (!c) rejected(5, "unknown class " + p.className);
+    p.className = c->name;
+    if (p.nameSpace.empty()) p.nameSpace = host.options().defaultNamespace;
+    return p;
+}
+
+ObjectPath pathArgument(Host& host, const std::string& text) {
+    try {
+        return host.parsePath(text);
+    } catch (const ParseError& e) {
+        rejected(4, e.what());
+    } catch (const CimError& e) {
+        rejected(e.rc(), e.what());
+    }
+}
+
+void checkFilterClass(Host& host, const std::string& cls, const char* option) {
+    if (!cls.empty() && !host.classes().exists(cls)) rejected(5, std::string("unknown class ") + cls + " (" + option + ")");
+}
+
+struct Assignment {
+    std::string name;
+    bool typed = false;  // Name:type=value
+    CimType type = CimType::String;
+    bool array = false;
+    std::string text;
+};
+
+Assignment assignment(const std::string& arg) {
+    std::size_t eq = arg.find('=');
+    if (eq == std::string::npos || eq == 0) usage("expected Name=value, got '" + arg + "'");
+    Assignment a;
+    a.name = arg.substr(0, eq);
+    a.text = arg.substr(eq + 1);
+    std::size_t colon = a.name.find(':');
+    if (colon != std::string::npos) {
+        std::string t = a.name.substr(colon + 1);
+        a.name = a.name.substr(0, colon);
+        if (t.size() > 2 && t.compare(t.size() - 2, 2, "[]") == 0) {
+            a.array = true;
+            t = t.substr(0, t.size() - 2);
+        }
+        if (equalsIgnoreCase(t, "ref") || equalsIgnoreCase(t, "reference")) a.type = CimType::Reference;
+        else if (!parseTypeName(t, a.type)) usage("unknown type '" + t + "' in '" + arg + "'");
+        a.typed = true;
+    }
+    if (a.name.empty()) usage("expected Name=value, got '" + arg + "'");
+    return a;
+}
+
+Value typedValue(Host& host, const Assignment& a, CimType type, bool array) {
+    try {
+        Value v = Value::parse(type, array, a.text);
+        if (type != CimType::Reference) return v;
+        // References name other classes: give their keys the declared types too.
+        if (!array) return Value::reference(host.classes().exists(v.asReference().className)
+                                                ? host.classes().typedPath(v.asReference())
+                                                : v.asReference());
+        std::vector<Element> typed;
+        for (const auto& e : v.elements()) {
+            const ObjectPath& p = *std::get<ObjectPathPtr>(e);
+            typed.emplace_back(std::make_shared<const ObjectPath>(
+                host.classes().exists(p.className) ? host.classes().typedPath(p) : p));
+        }
+        return Value::array(type, std::move(typed));
+    } catch (const ParseError& e) {
+        rejected(4, a.name + ": " + e.what());
+    } catch (const CimError& e) {
+        rejected(e.rc(), a.name + ": " + e.what());
+    }
+}
+
+Instance instanceArgument(Host& host, const ObjectPath& path, const std::vector<std::string>& args, std::size_t from) {
+    Instance inst;
+    inst.path = path;
+    for (const auto& k : path.keys) inst.properties.set(k.first, k.second);
+    for (std::size_t i = from; i < args.size(); ++i) {
+        Assignment a = assignment(args[i]);
+        if (a.typed) {
+            inst.properties.set(a.name, typedValue(host, a, a.type, a.array));
+            continue;
+        }
+        const PropertyDecl* p = host.classes().property(path.className, a.name);
+        if (!p) rejected(12, "class " + path.className + " has no property " + a.name);
+        inst.properties.set(p->name, typedValue(host, a, p->type, p->array));
+    }
+    return inst;
+}
+
+Args methodArguments(Host& host, const ObjectPath& path, const std::string& method,
+                     const std::vector<std::string>& args, std::size_t from) {
+    const MethodDecl* m = host.classes().method(path.className, method);
+    Args in;
+    for (std::size_t i = from; i < args.size(); ++i) {
+        Assignment a = assignment(args[i]);
+        if (a.typed) {
+            in.set(a.name, typedValue(host, a, a.type, a.array));
+        } else if (!m) {
+            in.set(a.name, typedValue(host, a, CimType::String, false));
+        } else {
+            const ParameterDecl* p = m->parameter(a.name);
+            if (!p) rejected(4, "method " + path.className + "." + m->name + " has no parameter " + a.name);
+            in.set(p->name, typedValue(host, a, p->type, p->array));
+        }
+    }
+    return in;
+}
+
+void need(const Options& o, std::size_t min, std::size_t max, const char* form) {
+    std::size_t n = o.positional.size() - 1;
+    if (n < min || n > max) usage(std::string("usage: ipif ") + form);
+}
+
+// Prints what a request produced, then fails with its status when it has one.
+void finish(const Result& r) {
+    if (!r.ok()) throw Failure{2, r.rc, r.message.empty() ? r.rcName() : r.message};
+}
+
+int execute(const Options& o, std::ostream& out, std::ostream& err) {
+    if (o.hostModelSet) setenv("IPIF_HOST_MODEL", o.hostModel.c_str(), 1);
+    HostOptions ho;
+    ho.mofPaths = o.mofs;
+    ho.regPaths = o.regs;
+    if (!o.nameSpace.empty()) ho.defaultNamespace = o.nameSpace;
+    std::unique_ptr<Host> hostPtr;
+    try {
+        hostPtr = std::make_unique<Host>(ho);
+    } catch (const std::exception& e) {
+        throw Failure{1, -1, e.what()};
+    }
+    Host& host = *hostPtr;
+    const std::vector<std::string>& a = o.positional;
+    const std::string& cmd = a[0];
+    bool json = o.json;
+    Result r;
+    std::unique_ptr<Failure> failed;
+    try {
+    if (cmd == "ein" || cmd == "ei") {
+        need(o, 1, 1, (cmd + " CLASS").c_str());
+        ObjectPath c = classArgument(host, a[1]);
+        if (cmd == "ein") {
+            r = host.enumerateInstanceNames(c.nameSpace, c.className);
+            printPaths(r.paths, json, out);
+        } else {
+            r = host.enumerateInstances(c.nameSpace, c.className);
+            printInstances(r.instances, json, out);
+        }
+        finish(r);
+    } else if (cmd == "gi") {
+        need(o, 1, 1, "gi PATH");
+        ObjectPath p = pathArgument(host, a[1]);
+        r = host.getInstance(p);
+        printInstances(r.instances, json, out);
+        finish(r);
+        if (r.instances.empty()) throw Failure{2, 6, "no instance matches " + p.toString()};
+    } else if (cmd == "mi" || cmd == "ci") {
+        need(o, cmd == "mi" ? 2 : 1, a.size(), (cmd + " PATH Prop=value ...").c_str());
+        ObjectPath p = pathArgument(host, a[1]);
+        Instance inst = instanceArgument(host, p, a, 2);
+        if (cmd == "mi") {
+            r = host.modifyInstance(p, inst);
+            if (json) out << "{}\n";
+        } else {
+            r = host.createInstance(p, inst);
+            printPaths(r.paths, json, out);
+        }
+        finish(r);
+    } else if (cmd == "di") {
+        need(o, 1, 1, "di PATH");
+        r = host.deleteInstance(pathArgument(host, a[1]));
+        if (json) out << "{}\n";
+        finish(r);
+    } else if (cmd == "eq") {
+        need(o, 2, 3, "eq CLASS QUERY [LANGUAGE]");
+        ObjectPath c = classArgument(host, a[1]);
+        r = host.execQuery(c.nameSpace, c.className, a[2], a.size() > 3 ? a[3] : "WQL");
+        printInstances(r.instances, json, out);
+        finish(r);
+    } else if (cmd == "ai" || cmd == "ain") {
+        need(o, 1, 1, (cmd + " PATH [-ac CLASS] [-rc CLASS] [-r ROLE] [-rr ROLE]").c_str());
+        ObjectPath p = pathArgument(host, a[1]);
+        checkFilterClass(host, o.assocClass, "-ac");
+        checkFilterClass(host, o.resultClass, "-rc");
+        if (cmd == "ai") {
+            r = host.associators(p, o.assocClass, o.resultClass, o.role, o.resultRole);
+            printInstances(r.instances, json, out);
+        } else {
+            r = host.associatorNames(p, o.assocClass, o.resultClass, o.role, o.resultRole);
+            printPaths(r.paths, json, out);
+        }
+        finish(r);
+    } else if (cmd == "ri" || cmd == "rin") {
+        need(o, 1, 1, (cmd + " PATH [-rc ASSOCCLASS] [-r ROLE]").c_str());
+        ObjectPath p = pathArgument(host, a[1]);
+        if (!o.resultRole.empty()) usage("-rr does not apply to " + cmd);
+        if (!o.assocClass.empty() && !o.resultClass.empty()) usage("give the association class once (-rc)");
+        std::string assoc = o.resultClass.empty() ? o.assocClass : o.resultClass;
+        checkFilterClass(host, assoc, "-rc");
+        if (cmd == "ri") {
+            r = host.references(p, assoc, o.role);
+            printInstances(r.instances, json, out);
+        } else {
+            r = host.referenceNames(p, assoc, o.role);
+            printPaths(r.paths, json, out);
+        }
+        finish(r);
+    } else if (cmd == "cm") {
+        need(o, 2, a.size(), "cm PATH METHOD [Arg=value ...]");
+        ObjectPath p = pathArgument(host, a[1]);
+        Args in = methodArguments(host, p, a[2], a, 3);
+        r = host.invokeMethod(p, a[2], in);
+        if (json) {
+            out << "{\"ReturnValue\": " << (r.hasReturnValue ? jsonValue(r.returnValue) : "null")
+                << ", \"outArgs\": " << jsonNamed(r.outArgs) << "}\n";
+        } else {
+            if (r.hasReturnValue) out << "ReturnValue = " << r.returnValue.toText() << ";\n";
+            for (const auto& arg : r.outArgs) out << arg.first << " = " << arg.second.toText() << ";\n";
+        }
+        finish(r);
+    } else {
+        usage("unknown command '" + cmd + "'");
+    }
+    } catch (const Failure& f) {
+        if (f.exitCode != 2) throw;
+        failed = std::make_unique<Failure>(f);
+    }
+    out.flush();
+    // A provider may have left a detached thread finishing its work (a reboot request).
+    long waitMs = 60000;
+    if (const char* w = std::getenv("IPIF_THREAD_WAIT_MS")) waitMs = std::strtol(w, nullptr, 10);
+    if (!host.waitForProviderThreads(std::chrono::milliseconds(waitMs)))
+        err << "ipif: warning: provider threads still running after " << waitMs << " ms\n";
+    if (failed) throw *failed;
+    return 0;
+}
+
+}  // namespace
+
+int run(const std::vector<std::string>& args, std::ostream& out, std::ostream& err) {
+    try {
+        Options o = parseOptions(args);
+        if (o.help) {
+            out << kUsage;
+            return 0;
+        }
+        if (o.positional.empty()) usage("no command given");
+        return execute(o, out, err);
+    } catch (const Failure& f) {
+        out.flush();
+        std::string msg = f.message;
+        for (auto& c : msg)
+            if (c == '\n' || c == '\r') c = ' ';
+        if (f.rc < 0)
+            err << "ipif: error: " << msg << "\n";
+        else
+            err << "ipif: error: rc " << f.rc << " (" << rcName(f.rc) << "): " << msg << "\n";
+        return f.exitCode;
+    } catch (const std::exception& e) {
+        out.flush();
+        err << "ipif: error: " << e.what() << "\n";
+        return 1;
+    }
+}
+
+}  // namespace cli
+}  // namespace ipif

@@ -35,7 +35,7 @@ public:
     CMPIAdapter& operator=(const CMPIAdapter&) = delete;
 
     // True while the model stands on an element.
-    explicit operator bool() {
+    explicit operator bool() const {
         traceLine(__func__, __LINE__, ENTERING);
         const bool valid = static_cast<bool>(model);
         traceLine(__func__, __LINE__, EXITING);

@@ -36,6 +36,10 @@
 //               123  U    IFF_UP: 1 up, 12 down                            1 up, 12 down, 9 down then up,
 //                                                                          on the kernel at once
 // Every endpoint carries every property; what the host lacks reads as "" or 0.
+// ifcfg writes are configuration for the interface's next start: the kernel, and so the node,
+// keeps its values until then (123 alone acts at once). A new ifcfg file starts with
+// DEVICE=<interface>; an IPv6 address also sets IPV6INIT=yes, without which the start-up scripts
+// ignore IPV6ADDR. An empty value removes the key. Values outside [A-Za-z0-9.:-_/%,@+] are refused.
 #include "LiveTree.h"
 
 #include <arpa/inet.h>

@@ -71,12 +71,13 @@ TEST_F(ConfigurationFileTest, CreatesMissingFilesAndCopesWithOddLines) {
 
 TEST_F(ConfigurationFileTest, RefusesUnsafeKeysAndValuesAndWritesNothing) {
     writeFile(file, "DEVICE=eth0\n");
-    for (const std::string& value : {"a b", "1.2.3.4\nBOOTPROTO=dhcp", "x;reboot", "$(id)", "`id`", "\"q\"", "'q'",
-                                     "a\\b", "a#b", "a=b", "a*", std::string("a\0b", 3), "\xc3\xa9"}) {
+    const std::vector<std::string> unsafeValues{"a b",  "1.2.3.4\nBOOTPROTO=dhcp", "x;reboot", "$(id)", "`id`",
+                                                "\"q\"", "'q'", "a\\b", "a#b", "a=b", "a*", std::string("a\0b", 3), "\xc3\xa9"};
+    for (const std::string& value : unsafeValues) {
         EXPECT_FALSE(updateConfigurationValue(file, "NETMASK", value)) << value;
         modifyValue(file, "NETMASK", value);
     }
-    for (const std::string& key : {"", "NET MASK", "A=B", "KEY\n", "K-1", "K.1"}) {
+    for (const std::string key : {"", "NET MASK", "A=B", "KEY\n", "K-1", "K.1"}) {
         EXPECT_FALSE(updateConfigurationValue(file, key, "1")) << key;
     }
     EXPECT_EQ(readFile(file), "DEVICE=eth0\n");

@@ -55,6 +55,12 @@ TEST_F(EndpointModel, WalksEveryEndpointAndFiltersNarrowWithoutRewinding) {
         // A second name cannot be found behind the first: the cursor never goes back.
         endpoints.setFilter(IPprotocolEndpoint::ByName, "eth0");
         EXPECT_FALSE(endpoints);
+        // Nor does a filter added after walking on.
+        IPprotocolEndpoint walked;
+        walked.setFilter(IPprotocolEndpoint::BySystemName, modeltest::hostName());
+        ++walked;
+        walked.setFilter(IPprotocolEndpoint::ByName, "eth0");
+        EXPECT_FALSE(walked);
         // initialize forgets the filters and starts over.
         endpoints.initialize();
         EXPECT_EQ(walk(endpoints).size(), 4u);

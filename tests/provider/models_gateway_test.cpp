@@ -97,8 +97,7 @@ TEST_F(GatewayModel, EnumerationStartsAtAGatewayPresentsBothGatewaysAndKeepsGate
     // Without any gateway on the host, there is nothing to present.
     testhost::HostBuilder bare;
     int ep = bare.endpoint(bare.root(), "eth0", "eth0");
-    setGateways(ep, "", "", 4096);
-    bare.unreadable(ep, IPv6Gateway);
+    bare.text(ep, IPv4Gateway, "").text(ep, IPv6Gateway, "2001:db8::1").unreadable(ep, IPv6Gateway);
     testhost::ScopedHostModel bareModel(bare);
     RemoteServiceAccessPoint none;
     EXPECT_FALSE(none);
@@ -196,10 +195,11 @@ TEST_F(GatewayModel, ServiceProcessorIsTheGrandparentDescribedBmc) {
     EXPECT_EQ(systemName, "BMC:-1");
     EXPECT_EQ(systemClass, "KVRNX_SPComputerSystem");
 
-    ++gateways;  // usb1: "BMC usb1" in its own description, but under the host
-    ASSERT_TRUE(gateways);
-    EXPECT_TRUE(gateways.getSystemName(systemName));
-    EXPECT_TRUE(gateways.getSystemCreationClassName(systemClass));
+    RemoteServiceAccessPoint lookalike;  // "BMC usb1" in its own description, but under the host
+    lookalike.setFilter(RemoteServiceAccessPoint::ByName, "usb1_IPv4");
+    ASSERT_TRUE(lookalike);
+    EXPECT_TRUE(lookalike.getSystemName(systemName));
+    EXPECT_TRUE(lookalike.getSystemCreationClassName(systemClass));
     EXPECT_EQ(systemName, modeltest::hostName());
     EXPECT_EQ(systemClass, "KVRNX_ComputerSystem");
 
@@ -207,7 +207,7 @@ TEST_F(GatewayModel, ServiceProcessorIsTheGrandparentDescribedBmc) {
     testhost::HostBuilder other;
     int sp = other.serviceProcessor("BMC ");
     int ep = other.endpoint(sp, "usb0", "BMC usb0");
-    setGateways(ep, "169.254.95.1", "", 4096);
+    other.text(ep, IPv4Gateway, "169.254.95.1");
     testhost::ScopedHostModel otherModel(other);
     RemoteServiceAccessPoint blank;
     ASSERT_TRUE(blank);
