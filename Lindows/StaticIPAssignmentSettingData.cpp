@@ -136,7 +136,7 @@ bool StaticIPAssignmentSettingData::getIPv6SubnetPrefixLength(unsigned short& pr
         for (char c : text) {
             if (c < '0' || c > '9') break;
             parsed = parsed * 10 + static_cast<unsigned long>(c - '0');
-            if (parsed > 0xffffffffUL) break;
+            if (parsed > 1000000UL) break;  // no prefix is that long; stop before overflowing
         }
         prefixLength = static_cast<unsigned short>(parsed);
     } else {

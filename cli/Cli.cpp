@@ -336,28 +336,15 @@ void need(const Options& o, std::size_t min, std::size_t max, const char* form) 
 
 // Prints what a request produced, then fails with its status when it has one.
 void finish(const Result& r) {
-    if (!r.ok()) throw Failure{2, r.rc, r.message.empty() ? r.rcName() : r.message};
+    if (!r.ok()) throw Failure{2, r.rc, r.message};
 }
 
-int execute(const Options& o, std::ostream& out, std::ostream& err) {
-    if (o.hostModelSet) setenv("IPIF_HOST_MODEL", o.hostModel.c_str(), 1);
-    HostOptions ho;
-    ho.mofPaths = o.mofs;
-    ho.regPaths = o.regs;
-    if (!o.nameSpace.empty()) ho.defaultNamespace = o.nameSpace;
-    std::unique_ptr<Host> hostPtr;
-    try {
-        hostPtr = std::make_unique<Host>(ho);
-    } catch (const std::exception& e) {
-        throw Failure{1, -1, e.what()};
-    }
-    Host& host = *hostPtr;
+// Runs one command against the host and prints what it produced.
+void dispatch(Host& host, const Options& o, std::ostream& out) {
     const std::vector<std::string>& a = o.positional;
     const std::string& cmd = a[0];
     bool json = o.json;
     Result r;
-    std::unique_ptr<Failure> failed;
-    try {
     if (cmd == "ein" || cmd == "ei") {
         need(o, 1, 1, (cmd + " CLASS").c_str());
         ObjectPath c = classArgument(host, a[1]);
@@ -443,6 +430,24 @@ int execute(const Options& o, std::ostream& out, std::ostream& err) {
     } else {
         usage("unknown command '" + cmd + "'");
     }
+}
+
+int execute(const Options& o, std::ostream& out, std::ostream& err) {
+    if (o.hostModelSet) setenv("IPIF_HOST_MODEL", o.hostModel.c_str(), 1);
+    HostOptions ho;
+    ho.mofPaths = o.mofs;
+    ho.regPaths = o.regs;
+    if (!o.nameSpace.empty()) ho.defaultNamespace = o.nameSpace;
+    std::unique_ptr<Host> hostPtr;
+    try {
+        hostPtr = std::make_unique<Host>(ho);
+    } catch (const std::exception& e) {
+        throw Failure{1, -1, e.what()};
+    }
+    Host& host = *hostPtr;
+    std::unique_ptr<Failure> failed;
+    try {
+        dispatch(host, o, out);
     } catch (const Failure& f) {
         if (f.exitCode != 2) throw;
         failed = std::make_unique<Failure>(f);
@@ -476,7 +481,8 @@ int run(const std::vector<std::string>& args, std::ostream& out, std::ostream& e
         if (f.rc < 0)
             err << "ipif: error: " << msg << "\n";
         else
-            err << "ipif: error: rc " << f.rc << " (" << rcName(f.rc) << "): " << msg << "\n";
+            err << "ipif: error: rc " << f.rc << " (" << rcName(f.rc) << ")" << (msg.empty() ? "" : ": ") << msg
+                << "\n";
         return f.exitCode;
     } catch (const std::exception& e) {
         out.flush();

@@ -60,7 +60,9 @@ bool upcallPath(HostImpl* h, const CMPIContext* ctx, const CMPIObjectPath* op, O
     return true;
 }
 
-// Common frame of every up-call: host check, nested request, exception fence.
+// Common frame of every up-call: host check, nested request, exception fence. What the
+// caller gets back (results, status messages) is made in out, the caller's arena: an up-call
+// from outside any request runs in a request of its own, whose memory goes when it returns.
 template <class R, class F>
 R upcall(const CMPIBroker* mb, CMPIStatus* rc, R fallback, F&& f) noexcept {
     HostImpl* h = hostOf(mb);
@@ -68,26 +70,27 @@ R upcall(const CMPIBroker* mb, CMPIStatus* rc, R fallback, F&& f) noexcept {
         setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
         return fallback;
     }
+    Arena* out = &h->arena();
     try {
         RequestScope scope(h);
         if (scope.tooDeep()) {
-            setStatus(rc, h, CMPI_RC_ERR_FAILED, "up-calls nested too deep");
+            setStatus(rc, h, CMPI_RC_ERR_FAILED, "up-calls nested too deep", out);
             return fallback;
         }
-        return f(h);
+        return f(h, *out);
     } catch (const CimError& e) {
-        setStatus(rc, h, static_cast<CMPIrc>(e.rc()), e.what());
+        setStatus(rc, h, static_cast<CMPIrc>(e.rc()), e.what(), out);
     } catch (const std::exception& e) {
-        setStatus(rc, h, CMPI_RC_ERR_FAILED, e.what());
+        setStatus(rc, h, CMPI_RC_ERR_FAILED, e.what(), out);
     } catch (...) {
         setStatus(rc, CMPI_RC_ERR_FAILED);
     }
     return fallback;
 }
 
-CMPIEnumeration* enumerationOf(HostImpl* h, const Result& r, bool names, CMPIStatus* rc) {
+CMPIEnumeration* enumerationOf(HostImpl* h, Arena& out, const Result& r, bool names, CMPIStatus* rc) {
     if (!r.ok()) {
-        setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message);
+        setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message, &out);
         return nullptr;
     }
     std::vector<Value> items;
@@ -96,7 +99,7 @@ CMPIEnumeration* enumerationOf(HostImpl* h, const Result& r, bool names, CMPISta
     else
         for (const auto& i : r.instances) items.push_back(Value::instance(i));
     setStatus(rc, CMPI_RC_OK);
-    return make<EnumObj>(h, std::move(items));
+    return makeIn<EnumObj>(out, h, std::move(items));
 }
 
 // ---- Up-calls ------------------------------------------------------------------------------
@@ -138,60 +141,60 @@ CMPIStatus bDeliverIndication(const CMPIBroker* mb, const CMPIContext*, const ch
 
 CMPIEnumeration* bEnumInstanceNames(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op,
                                     CMPIStatus* rc) {
-    return upcall<CMPIEnumeration*>(mb, rc, nullptr, [&](HostImpl* h) -> CMPIEnumeration* {
+    return upcall<CMPIEnumeration*>(mb, rc, nullptr, [&](HostImpl* h, Arena& out) -> CMPIEnumeration* {
         ObjectPath p;
         if (!upcallPath(h, ctx, op, p)) return setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER), nullptr;
-        return enumerationOf(h, h->enumerate(p, true, nullptr, entriesOf(ctx)), true, rc);
+        return enumerationOf(h, out, h->enumerate(p, true, nullptr, entriesOf(ctx)), true, rc);
     });
 }
 
 CMPIEnumeration* bEnumInstances(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op,
                                 const char** props, CMPIStatus* rc) {
-    return upcall<CMPIEnumeration*>(mb, rc, nullptr, [&](HostImpl* h) -> CMPIEnumeration* {
+    return upcall<CMPIEnumeration*>(mb, rc, nullptr, [&](HostImpl* h, Arena& out) -> CMPIEnumeration* {
         ObjectPath p;
         if (!upcallPath(h, ctx, op, p)) return setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER), nullptr;
         std::vector<std::string> pl = propertyList(props);
-        return enumerationOf(h, h->enumerate(p, false, props ? &pl : nullptr, entriesOf(ctx)), false, rc);
+        return enumerationOf(h, out, h->enumerate(p, false, props ? &pl : nullptr, entriesOf(ctx)), false, rc);
     });
 }
 
 CMPIInstance* bGetInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op,
                            const char** props, CMPIStatus* rc) {
-    return upcall<CMPIInstance*>(mb, rc, nullptr, [&](HostImpl* h) -> CMPIInstance* {
+    return upcall<CMPIInstance*>(mb, rc, nullptr, [&](HostImpl* h, Arena& out) -> CMPIInstance* {
         ObjectPath p;
         if (!upcallPath(h, ctx, op, p)) return setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER), nullptr;
         std::vector<std::string> pl = propertyList(props);
         Result r = h->get(p, props ? &pl : nullptr, entriesOf(ctx));
-        if (!r.ok()) return setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message), nullptr;
-        if (r.instances.empty()) return setStatus(rc, h, CMPI_RC_ERR_NOT_FOUND, "no instance " + p.toString()), nullptr;
+        if (!r.ok()) return setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message, &out), nullptr;
+        if (r.instances.empty()) return setStatus(rc, h, CMPI_RC_ERR_NOT_FOUND, "no instance " + p.toString(), &out), nullptr;
         setStatus(rc, CMPI_RC_OK);
-        return make<InstanceObj>(h, r.instances.front());
+        return makeIn<InstanceObj>(out, h, r.instances.front());
     });
 }
 
 CMPIObjectPath* bCreateInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op,
                                 const CMPIInstance* inst, CMPIStatus* rc) {
-    return upcall<CMPIObjectPath*>(mb, rc, nullptr, [&](HostImpl* h) -> CMPIObjectPath* {
+    return upcall<CMPIObjectPath*>(mb, rc, nullptr, [&](HostImpl* h, Arena& out) -> CMPIObjectPath* {
         ObjectPath p;
         InstanceObj* i = asInstance(inst);
         if (!upcallPath(h, ctx, op, p) || !i) return setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER), nullptr;
         Result r = h->create(p, i->inst, entriesOf(ctx));
-        if (!r.ok()) return setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message), nullptr;
+        if (!r.ok()) return setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message, &out), nullptr;
         setStatus(rc, CMPI_RC_OK);
-        return make<PathObj>(h, r.paths.empty() ? p : r.paths.front());
+        return makeIn<PathObj>(out, h, r.paths.empty() ? p : r.paths.front());
     });
 }
 
 CMPIStatus bModifyInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op,
                            const CMPIInstance* inst, const char** props) {
     CMPIStatus st = okStatus();
-    upcall<int>(mb, &st, 0, [&](HostImpl* h) {
+    upcall<int>(mb, &st, 0, [&](HostImpl* h, Arena& out) {
         ObjectPath p;
         InstanceObj* i = asInstance(inst);
         if (!upcallPath(h, ctx, op, p) || !i) return setStatus(&st, CMPI_RC_ERR_INVALID_PARAMETER), 0;
         std::vector<std::string> pl = propertyList(props);
         Result r = h->modify(p, i->inst, props ? &pl : nullptr, entriesOf(ctx));
-        setStatus(&st, h, static_cast<CMPIrc>(r.rc), r.message);
+        setStatus(&st, h, static_cast<CMPIrc>(r.rc), r.message, &out);
         return 0;
     });
     return st;
@@ -199,11 +202,11 @@ CMPIStatus bModifyInstance(const CMPIBroker* mb, const CMPIContext* ctx, const C
 
 CMPIStatus bDeleteInstance(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op) {
     CMPIStatus st = okStatus();
-    upcall<int>(mb, &st, 0, [&](HostImpl* h) {
+    upcall<int>(mb, &st, 0, [&](HostImpl* h, Arena& out) {
         ObjectPath p;
         if (!upcallPath(h, ctx, op, p)) return setStatus(&st, CMPI_RC_ERR_INVALID_PARAMETER), 0;
         Result r = h->remove(p, entriesOf(ctx));
-        setStatus(&st, h, static_cast<CMPIrc>(r.rc), r.message);
+        setStatus(&st, h, static_cast<CMPIrc>(r.rc), r.message, &out);
         return 0;
     });
     return st;
@@ -211,24 +214,24 @@ CMPIStatus bDeleteInstance(const CMPIBroker* mb, const CMPIContext* ctx, const C
 
 CMPIEnumeration* bExecQuery(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op,
                             const char* query, const char* lang, CMPIStatus* rc) {
-    return upcall<CMPIEnumeration*>(mb, rc, nullptr, [&](HostImpl* h) -> CMPIEnumeration* {
+    return upcall<CMPIEnumeration*>(mb, rc, nullptr, [&](HostImpl* h, Arena& out) -> CMPIEnumeration* {
         ObjectPath p;
         if (!upcallPath(h, ctx, op, p) || !query) return setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER), nullptr;
-        return enumerationOf(h, h->query(p, query, text(lang), entriesOf(ctx)), false, rc);
+        return enumerationOf(h, out, h->query(p, query, text(lang), entriesOf(ctx)), false, rc);
     });
 }
 
 CMPIEnumeration* assocUpcall(const CMPIBroker* mb, HostImpl::AssocOp op, const CMPIContext* ctx,
                              const CMPIObjectPath* source, const char* assocClass, const char* resultClass,
                              const char* role, const char* resultRole, const char** props, CMPIStatus* rc) {
-    return upcall<CMPIEnumeration*>(mb, rc, nullptr, [&](HostImpl* h) -> CMPIEnumeration* {
+    return upcall<CMPIEnumeration*>(mb, rc, nullptr, [&](HostImpl* h, Arena& out) -> CMPIEnumeration* {
         ObjectPath p;
         if (!upcallPath(h, ctx, source, p)) return setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER), nullptr;
         std::vector<std::string> pl = propertyList(props);
         Result r = h->assoc(op, p, text(assocClass), text(resultClass), text(role), text(resultRole),
                             props ? &pl : nullptr, entriesOf(ctx));
         bool names = op == HostImpl::AssocOp::AssociatorNames || op == HostImpl::AssocOp::ReferenceNames;
-        return enumerationOf(h, r, names, rc);
+        return enumerationOf(h, out, r, names, rc);
     });
 }
 
@@ -259,7 +262,7 @@ CMPIEnumeration* bReferenceNames(const CMPIBroker* mb, const CMPIContext* ctx, c
 
 CMPIData bInvokeMethod(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op,
                        const char* method, const CMPIArgs* in, CMPIArgs* out, CMPIStatus* rc) {
-    return upcall<CMPIData>(mb, rc, nullData(), [&](HostImpl* h) -> CMPIData {
+    return upcall<CMPIData>(mb, rc, nullData(), [&](HostImpl* h, Arena& arena) -> CMPIData {
         ObjectPath p;
         if (!upcallPath(h, ctx, op, p) || !method) return setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER), nullData();
         ArgsObj* inArgs = asArgs(in);
@@ -267,8 +270,8 @@ CMPIData bInvokeMethod(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIO
         Result r = h->invoke(p, method, inArgs ? inArgs->args : Args(), entriesOf(ctx));
         if (ArgsObj* o = asArgs(out))
             for (const auto& a : r.outArgs) o->args.set(a.first, a.second);
-        setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message);
-        return r.hasReturnValue ? makeData(h, r.returnValue) : nullData();
+        setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message, &arena);
+        return r.hasReturnValue ? makeData(h, r.returnValue, 0, &arena) : nullData();
     });
 }
 
@@ -279,15 +282,15 @@ CMPIStatus bSetProperty(const CMPIBroker* mb, const CMPIContext*, const CMPIObje
 
 CMPIData bGetProperty(const CMPIBroker* mb, const CMPIContext* ctx, const CMPIObjectPath* op, const char* name,
                       CMPIStatus* rc) {
-    return upcall<CMPIData>(mb, rc, nullData(), [&](HostImpl* h) -> CMPIData {
+    return upcall<CMPIData>(mb, rc, nullData(), [&](HostImpl* h, Arena& out) -> CMPIData {
         ObjectPath p;
         if (!upcallPath(h, ctx, op, p) || !name) return setStatus(rc, CMPI_RC_ERR_INVALID_PARAMETER), nullData();
         Result r = h->get(p, nullptr, entriesOf(ctx));
-        if (!r.ok()) return setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message), nullData();
+        if (!r.ok()) return setStatus(rc, h, static_cast<CMPIrc>(r.rc), r.message, &out), nullData();
         const Value* v = r.instances.empty() ? nullptr : r.instances.front().property(name);
         if (!v) return setStatus(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY), nullData(CMPI_nullValue | CMPI_notFound);
         setStatus(rc, CMPI_RC_OK);
-        return makeData(h, *v);
+        return makeData(h, *v, 0, &out);
     });
 }
 

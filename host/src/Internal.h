@@ -177,6 +177,9 @@ void releaseAll(HostImpl* host);
 template <class T, class... A>
 T* make(HostImpl* host, A&&... args);
 
+template <class T, class... A>
+T* makeIn(Arena& arena, HostImpl* host, A&&... args);
+
 // Creates a clone owned by the provider.
 template <class T, class... A>
 T* makeClone(HostImpl* host, A&&... args);
@@ -198,14 +201,15 @@ bool cimTypeOf(CMPIType t, CimType& out, bool& array);
 // Reads what a provider passes as (value, type), following the brokers' convention that a
 // CMPI_chars value is the char* itself. Returns the CMPI rc.
 CMPIrc readValue(const CMPIValue* value, CMPIType type, Value& out);
-// A CMPIData of a host value; strings, paths, arrays... are created in host's current arena.
-CMPIData makeData(HostImpl* host, const Value& v, CMPIValueState extraState = 0);
+// A CMPIData of a host value; strings, paths, arrays... are created in arena, by default the
+// host's current one.
+CMPIData makeData(HostImpl* host, const Value& v, CMPIValueState extraState = 0, Arena* arena = nullptr);
 CMPIData nullData(CMPIValueState state = CMPI_nullValue);
 
 CMPIStatus okStatus();
-CMPIStatus status(HostImpl* host, CMPIrc rc, const std::string& message);
+CMPIStatus status(HostImpl* host, CMPIrc rc, const std::string& message, Arena* arena = nullptr);
 void setStatus(CMPIStatus* st, CMPIrc rc);
-void setStatus(CMPIStatus* st, HostImpl* host, CMPIrc rc, const std::string& message);
+void setStatus(CMPIStatus* st, HostImpl* host, CMPIrc rc, const std::string& message, Arena* arena = nullptr);
 // The text of a status message of any provider-made string (ours or not).
 std::string statusText(const CMPIStatus& st);
 
@@ -282,6 +286,11 @@ namespace detail {
 template <class T, class... A>
 T* make(HostImpl* host, A&&... args) {
     return host->arena().adopt(std::unique_ptr<T>(new T(host, std::forward<A>(args)...)));
+}
+
+template <class T, class... A>
+T* makeIn(Arena& arena, HostImpl* host, A&&... args) {
+    return arena.adopt(std::unique_ptr<T>(new T(host, std::forward<A>(args)...)));
 }
 
 template <class T, class... A>

@@ -272,7 +272,8 @@ private:
             }
             qs.push_back(std::move(q));
             if (isPunct("]")) break;
-            expectPunct(",");
+            if (!isPunct(",")) fail("expected ',' or ']' in the qualifier list, found " + describe());
+            advance();
         }
         advance();
         return qs;
@@ -307,6 +308,8 @@ private:
         int line = tok_.line;
         std::string word = identifier(context);
         if (isWord("ref")) {
+            CimType dataType;
+            if (parseTypeName(word, dataType)) lex_.fail(line, "REF needs a class name, not the data type '" + word + "'");
             advance();
             type = CimType::Reference;
             refClass = word;
@@ -362,7 +365,10 @@ private:
             m.origin = c.name;
             advance();
             while (!isPunct(")")) {
-                if (!m.parameters.empty()) expectPunct(",");
+                if (!m.parameters.empty()) {
+                    if (!isPunct(",")) fail("expected ',' or ')' in the parameter list, found " + describe());
+                    advance();
+                }
                 m.parameters.push_back(parameter());
             }
             advance();
@@ -659,22 +665,7 @@ Value ClassRepository::convert(const Value& value, CimType type, bool array, con
     };
     if (!array) {
         if (value.type() == type && type != CimType::Reference) return value;
-        std::vector<Element> out{one(value.elements().at(0))};
-        Value v = Value::array(type, std::move(out));
-        // Re-wrap as a scalar of the same element.
-        const Element& e = v.elements()[0];
-        switch (e.index()) {
-        case 1: return Value::boolean(std::get<bool>(e));
-        case 2: return Value::fromUnsigned(type, std::get<std::uint64_t>(e));
-        case 3: return Value::fromSigned(type, std::get<std::int64_t>(e));
-        case 4: return type == CimType::Real32 ? Value::real32(static_cast<float>(std::get<double>(e)))
-                                               : Value::real64(std::get<double>(e));
-        case 5: return type == CimType::DateTime ? Value::dateTime(std::get<std::string>(e))
-                                                 : Value::string(std::get<std::string>(e));
-        case 6: return Value::reference(*std::get<ObjectPathPtr>(e));
-        case 7: return Value::instance(*std::get<InstancePtr>(e));
-        }
-        return Value::null(type);
+        return Value::scalar(type, one(value.elements().at(0)));
     }
     if (value.type() == type && type != CimType::Reference) return value;
     std::vector<Element> out;

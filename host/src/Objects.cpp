@@ -342,7 +342,7 @@ CMPIrc readScalar(const CMPIValue* v, CMPIType base, Element& e) {
     }
 }
 
-void fillValue(HostImpl* host, CimType t, const Element& e, CMPIValue& out) {
+void fillValue(HostImpl* host, Arena& arena, CimType t, const Element& e, CMPIValue& out) {
     switch (t) {
     case CimType::Boolean: out.boolean = std::get<bool>(e) ? 1 : 0; break;
     case CimType::Char16: out.char16 = static_cast<CMPIChar16>(std::get<std::uint64_t>(e)); break;
@@ -356,17 +356,17 @@ void fillValue(HostImpl* host, CimType t, const Element& e, CMPIValue& out) {
     case CimType::Sint64: out.sint64 = std::get<std::int64_t>(e); break;
     case CimType::Real32: out.real32 = static_cast<CMPIReal32>(std::get<double>(e)); break;
     case CimType::Real64: out.real64 = std::get<double>(e); break;
-    case CimType::String: out.string = make<StringObj>(host, std::get<std::string>(e)); break;
+    case CimType::String: out.string = makeIn<StringObj>(arena, host, std::get<std::string>(e)); break;
     case CimType::DateTime: {
         const std::string& text = std::get<std::string>(e);
         CMPIUint64 bin = 0;
         bool interval = text.size() == 25 && text[21] == ':';
         dateTimeFromText(text, bin, interval);
-        out.dateTime = make<DateTimeObj>(host, text, bin, interval);
+        out.dateTime = makeIn<DateTimeObj>(arena, host, text, bin, interval);
         break;
     }
-    case CimType::Reference: out.ref = make<PathObj>(host, *std::get<ObjectPathPtr>(e)); break;
-    case CimType::Instance: out.inst = make<InstanceObj>(host, *std::get<InstancePtr>(e)); break;
+    case CimType::Reference: out.ref = makeIn<PathObj>(arena, host, *std::get<ObjectPathPtr>(e)); break;
+    case CimType::Instance: out.inst = makeIn<InstanceObj>(arena, host, *std::get<InstancePtr>(e)); break;
     }
 }
 
@@ -406,7 +406,8 @@ CMPIData nullData(CMPIValueState state) {
     return d;
 }
 
-CMPIData makeData(HostImpl* host, const Value& v, CMPIValueState extraState) {
+CMPIData makeData(HostImpl* host, const Value& v, CMPIValueState extraState, Arena* arena) {
+    Arena& a = arena ? *arena : host->arena();
     CMPIData d;
     std::memset(&d, 0, sizeof d);
     d.type = cmpiTypeOf(v.type(), v.isArray());
@@ -416,10 +417,10 @@ CMPIData makeData(HostImpl* host, const Value& v, CMPIValueState extraState) {
         return d;
     }
     if (v.isArray()) {
-        d.value.array = make<ArrayObj>(host, v.type(), v.elements());
+        d.value.array = makeIn<ArrayObj>(a, host, v.type(), v.elements());
         return d;
     }
-    fillValue(host, v.type(), v.elements()[0], d.value);
+    fillValue(host, a, v.type(), v.elements()[0], d.value);
     return d;
 }
 
@@ -430,13 +431,13 @@ CMPIStatus okStatus() {
     return s;
 }
 
-CMPIStatus status(HostImpl* host, CMPIrc rc, const std::string& message) {
+CMPIStatus status(HostImpl* host, CMPIrc rc, const std::string& message, Arena* arena) {
     CMPIStatus s;
     s.rc = rc;
     s.msg = nullptr;
     if (host && !message.empty()) {
         try {
-            s.msg = make<StringObj>(host, message);
+            s.msg = makeIn<StringObj>(arena ? *arena : host->arena(), host, message);
         } catch (...) {
         }
     }
@@ -450,8 +451,8 @@ void setStatus(CMPIStatus* st, CMPIrc rc) {
     }
 }
 
-void setStatus(CMPIStatus* st, HostImpl* host, CMPIrc rc, const std::string& message) {
-    if (st) *st = status(host, rc, message);
+void setStatus(CMPIStatus* st, HostImpl* host, CMPIrc rc, const std::string& message, Arena* arena) {
+    if (st) *st = status(host, rc, message, arena);
 }
 
 std::string statusText(const CMPIStatus& st) {

@@ -256,10 +256,12 @@ Document parseDocument(const std::string& text, const std::string& origin) {
                 value.readOnly = true;
             else if (isWord(t[i], "unreadable"))
                 value.readable = false;
+            else if (isWord(t[i], "failing"))
+                value.failing = true;
             else
                 break;
         }
-        if (i + 1 >= t.size()) fail(origin, number, "expected: [readonly] [unreadable] NUMBER KIND VALUE...");
+        if (i + 1 >= t.size()) fail(origin, number, "expected: [readonly] [unreadable] [failing] NUMBER KIND VALUE...");
         unsigned int property;
         if (t[i].quoted || !parseNumber(t[i].text, property))
             fail(origin, number, "expected \"node\" or a property number, found \"" + t[i].text + "\"");
@@ -446,6 +448,7 @@ std::string formatFixture(const Tree& tree) {
             out += indent + "  ";
             if (value.readOnly) out += "readonly ";
             if (!value.readable) out += "unreadable ";
+            if (value.failing) out += "failing ";
             out += std::to_string(number) + " " + kindWord(value.kind);
             std::string text = formatValue(value);
             if (!text.empty()) out += " " + text;  // only an empty list has no value text

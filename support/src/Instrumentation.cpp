@@ -1,5 +1,9 @@
 #include "Nx/Instrumentation.h"
 
+#include <string>
+
+#include "Nx/Exceptions.h"
+
 namespace Nx {
 
 using HostModel::PropertyValue;
@@ -63,7 +67,11 @@ const PropertyValue* readable(const HostModel::Node* node, NodeLexicon::Properti
                               PropertyValue::Kind kind) {
     if (!node) return nullptr;
     auto found = node->properties.find(property);
-    if (found == node->properties.end() || !found->second.readable || found->second.kind != kind) return nullptr;
+    if (found == node->properties.end()) return nullptr;
+    if (found->second.failing)
+        throw InstrumentationException("Property " + std::to_string(property) + " of " + node->path +
+                                       " could not be read from the host");
+    if (!found->second.readable || found->second.kind != kind) return nullptr;
     return &found->second;
 }
 

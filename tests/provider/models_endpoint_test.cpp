@@ -212,36 +212,4 @@ TEST_F(EndpointModel, AddressOriginTableAndRoundTrips) {
     }
 }
 
-TEST_F(EndpointModel, VersionCodesAndSixteenBitReads) {
-    struct Case {
-        unsigned int code;
-        unsigned short support, type;
-    };
-    // support starts at 42 so that "left unchanged" shows.
-    for (Case c : {Case{1, 1, 1}, Case{2, 2, 2}, Case{3, 3, 0}, Case{4, 42, 0}, Case{0, 42, 0}}) {
-        host.number(eth0, IPVersion, c.code);
-        testhost::ScopedHostModel model(host);
-        IPprotocolEndpoint endpoint;
-        unsigned short support = 42, type = 42;
-        EXPECT_TRUE(endpoint.getIPVersionSupport(support));
-        EXPECT_TRUE(endpoint.getAddressType(type));
-        EXPECT_EQ(support, c.support) << c.code;
-        EXPECT_EQ(type, c.type) << c.code;
-    }
-
-    host.number(eth0, PrefixLength, 0x10040).number(eth0, IPv6AddressType, 0x20002);
-    testhost::ScopedHostModel model(host);
-    IPprotocolEndpoint endpoint;
-    unsigned int prefix = 0;
-    unsigned short prefix16 = 0, ipv6Type = 0, ifType = 7;
-    EXPECT_TRUE(endpoint.getPrefixLength(prefix));
-    EXPECT_TRUE(endpoint.getIPv6SubnetPrefixLength(prefix16));
-    EXPECT_TRUE(endpoint.getIPv6AddressType(ipv6Type));
-    EXPECT_EQ(prefix, 0x10040u);
-    EXPECT_EQ(prefix16, 0x40);
-    EXPECT_EQ(ipv6Type, 2);
-    EXPECT_FALSE(endpoint.getProtocolIFType(ifType));  // the node has no such property
-    EXPECT_EQ(ifType, 7);
-}
-
 }  // namespace

@@ -134,21 +134,21 @@ TEST_F(ServiceModel, CapabilitiesWithAnUnreadableOrMissingName) {
 }
 
 TEST_F(ServiceModel, TracesCarryEntryExitParametersAndRefusals) {
-    testfiles::ScopedEnv level("IPIF_LOG_LEVEL", "3000");
-    testfiles::ScopedEnv trace("IPIF_TRACE_FILE", dataDir.file("trace.log"));
-    testfiles::ScopedEnv log("IPIF_LOG_FILE", dataDir.file("log.log"));
-    TALog::TALogger::reconfigure();
+    std::string traced, logged;
     {
+        testfiles::ScopedEnv level("IPIF_LOG_LEVEL", "3000");
+        testfiles::ScopedEnv trace("IPIF_TRACE_FILE", dataDir.file("trace.log"));
+        testfiles::ScopedEnv log("IPIF_LOG_FILE", dataDir.file("log.log"));
+        TALog::TALogger::reconfigure();
         testhost::ScopedHostModel model(host);
         IPprotocolEndpoint endpoint;
         endpoint.setFilter(IPprotocolEndpoint::ByName, "eth1");
         endpoint.setEnabledState(3);
         Nx::IPInterfaceProvider::modifyValue(dataDir.file("ifcfg-x"), "NETMASK", "1 2");
+        traced = testfiles::readFile(dataDir.file("trace.log"));
+        logged = testfiles::readFile(dataDir.file("log.log"));
     }
-    const std::string traced = testfiles::readFile(dataDir.file("trace.log"));
-    const std::string logged = testfiles::readFile(dataDir.file("log.log"));
-    testfiles::ScopedEnv quiet("IPIF_LOG_LEVEL", "6000");
-    TALog::TALogger::reconfigure();
+    TALog::TALogger::reconfigure();  // back to the environment the run started with
 
     EXPECT_NE(traced.find("ENTERING: setFilter() in ModelPattern.h [Line: "), std::string::npos) << traced;
     EXPECT_NE(traced.find("],Parameters List:  filterType=1 reference=eth1"), std::string::npos) << traced;

@@ -33,6 +33,7 @@
 //     class as the filter. A filter naming a class the MOF does not know goes to every
 //     association provider of the namespace unchanged (the provider decides). Role, result
 //     role and result class are passed on; the host does not post-filter results.
+// Registrations naming a class the MOF does not declare are kept but never routed to.
 // Paths given to the API are typed through the MOF (ClassRepository::typedPath) before they
 // reach a provider; an empty namespace means HostOptions::defaultNamespace.
 //
@@ -53,7 +54,6 @@
 // not drive the same provider library from two Hosts at once.
 #pragma once
 
-#include <atomic>
 #include <chrono>
 #include <cstddef>
 #include <memory>

@@ -18,6 +18,7 @@ struct PropertyValue {
     std::vector<std::string> list;
     bool readable = true;   // false: the host cannot report it, every read fails
     bool readOnly = false;  // true: writes are refused and isPropertyReadOnly says so
+    bool failing = false;   // true: the host errors on reading it; a read throws InstrumentationException
 
     static PropertyValue ofText(std::string v);
     static PropertyValue ofNumber(unsigned int v);
