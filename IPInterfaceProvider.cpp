@@ -413,6 +413,16 @@ CMPIStatus IPInterface_InvokeMethod(CMPIMethodMI*, const CMPIContext* ctx, const
                     ret = CMPI_RC_ERR_METHOD_NOT_FOUND;
                 }
             }
+        } else if (classId == IPConfigurationServiceId) {
+            // The one service needs no lookup: the method is run whatever the path names.
+            CMPIIPConfigurationService service(broker, ctx, cop);
+            if (method && std::strcmp(method, "ApplySettingToIPProtocolEndpoint") == 0) {
+                ret = service.executeMethod(in, out, &status);
+                NX_VAR(loggerIPInterfaceProvider, "ret", static_cast<unsigned>(ret));
+            } else {
+                status.rc = CMPI_RC_ERR_METHOD_NOT_FOUND;
+                ret = CMPI_RC_ERR_METHOD_NOT_FOUND;
+            }
         } else {
             status.rc = CMPI_RC_ERR_INVALID_CLASS;
             ret = CMPI_RC_ERR_INVALID_CLASS;

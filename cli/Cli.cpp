@@ -3,6 +3,7 @@
 #include <cmath>
 #include <cstdio>
 #include <cstdlib>
+#include <exception>
 #include <iostream>
 #include <memory>
 #include <sstream>
@@ -445,12 +446,12 @@ int execute(const Options& o, std::ostream& out, std::ostream& err) {
         throw Failure{1, -1, e.what()};
     }
     Host& host = *hostPtr;
-    std::unique_ptr<Failure> failed;
+    // Whatever the outcome, the wait below must come first.
+    std::exception_ptr failed;
     try {
         dispatch(host, o, out);
-    } catch (const Failure& f) {
-        if (f.exitCode != 2) throw;
-        failed = std::make_unique<Failure>(f);
+    } catch (...) {
+        failed = std::current_exception();
     }
     out.flush();
     // A provider may have left a detached thread finishing its work (a reboot request).
@@ -458,7 +459,7 @@ int execute(const Options& o, std::ostream& out, std::ostream& err) {
     if (const char* w = std::getenv("IPIF_THREAD_WAIT_MS")) waitMs = std::strtol(w, nullptr, 10);
     if (!host.waitForProviderThreads(std::chrono::milliseconds(waitMs)))
         err << "ipif: warning: provider threads still running after " << waitMs << " ms\n";
-    if (failed) throw *failed;
+    if (failed) std::rethrow_exception(failed);
     return 0;
 }
 

@@ -588,23 +588,39 @@ int xSignalCondition(void* c) {
 
 // ---- Memory --------------------------------------------------------------------------------
 
-// mark/release work on the objects of the calling thread's current arena; the mark is the
-// object count at that moment.
+// mark/release need a request of the calling thread (or an attached thread): the host's own
+// arena is shared by every thread outside a request, so a release there could take objects
+// another thread still uses. The mark lives in the request's memory.
+struct GcMark {
+    Arena* arena;
+    std::size_t count;
+};
+
 CMPIGcStat* mMark(const CMPIBroker* mb, CMPIStatus* rc) {
     HostImpl* h = hostOf(mb);
-    if (!h) {
-        setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE);
+    Frame* f = currentFrame();
+    if (!h || !f || f->host != h) {
+        setStatus(rc, h ? CMPI_RC_ERR_NOT_SUPPORTED : CMPI_RC_ERR_INVALID_HANDLE);
         return nullptr;
     }
+    auto* m = static_cast<GcMark*>(f->arena.allocate(sizeof(GcMark), true));
+    if (!m) {
+        setStatus(rc, CMPI_RC_ERR_FAILED);
+        return nullptr;
+    }
+    m->arena = &f->arena;
+    m->count = f->arena.mark();
     setStatus(rc, CMPI_RC_OK);
-    return reinterpret_cast<CMPIGcStat*>(h->arena().mark() + 1);
+    return m;
 }
 
 CMPIStatus mRelease(const CMPIBroker* mb, const CMPIGcStat* gc) {
     HostImpl* h = hostOf(mb);
     if (!h) return rcStatus(CMPI_RC_ERR_INVALID_HANDLE);
-    if (!gc) return rcStatus(CMPI_RC_ERR_INVALID_PARAMETER);
-    h->arena().releaseTo(reinterpret_cast<std::size_t>(gc) - 1);
+    Frame* f = currentFrame();
+    const auto* m = static_cast<const GcMark*>(gc);
+    if (!m || !f || f->host != h || m->arena != &f->arena) return rcStatus(CMPI_RC_ERR_INVALID_PARAMETER);
+    f->arena.releaseTo(m->count);
     return okStatus();
 }
 

@@ -1,0 +1,29 @@
+#include "Lindows/RemoteHostedAccessPoint.h"
+
+#include "Lindows/AssociationModel.h"
+#include "Trace.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+static const std::string loggerRemoteHostedAccessPoint = "Tarvo.IPInterfaceProvider";
+
+RemoteHostedAccessPoint::RemoteHostedAccessPoint() = default;
+RemoteHostedAccessPoint::~RemoteHostedAccessPoint() = default;
+
+Nx::Moniker RemoteHostedAccessPoint::getSystemMoniker(Nx::Moniker& accessPoint) {
+    return computerSystemMoniker(accessPoint, instrumentation);
+}
+
+Nx::Moniker RemoteHostedAccessPoint::getRemoteSAPMoniker(Nx::Moniker& computer) {
+    NX_ENTER(loggerRemoteHostedAccessPoint);
+    const std::string name = requireKey(computer, "Name", "Could not find 'Name' key in Moniker");
+    requireHostComputer(name);
+    Nx::Moniker result;
+    result.addKey("SystemName", name);
+    NX_EXIT(loggerRemoteHostedAccessPoint);
+    return result;
+}
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx

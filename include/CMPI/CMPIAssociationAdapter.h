@@ -1,0 +1,321 @@
+// What the eleven association adapters share.
+//
+// An association adapter is built from the source path of an association request. It owns the
+// association's model (which turns one end's moniker into the other's) and one adapter per end:
+// an instance adapter for ends this provider serves, a lookup adapter (CMPIIPComputerSystem,
+// CMPIIPLanEndPoint) for ends other providers serve. The class of the source path decides which
+// end is fed from the path, which one is located through the model, and which one is walked:
+//   - the source is one end: that end is positioned on the path, the other end is located from
+//     it and walked; it is the far end that associators report;
+//   - the source is the association class: the adapter walks one end and pairs it with the other
+//     as its constructor states (the walked end moves, the other stays where it was put);
+//   - any other class: neither end is positioned and the adapter yields nothing.
+// A derived adapter names its class and ends (AssociationClass), its locate operations and its
+// construction by class id; it may add the association's own properties by defining
+// setAssociationProperties.
+#pragma once
+
+#include <cmpidt.h>
+#include <cmpift.h>
+#include <strings.h>
+
+#include <functional>
+#include <string>
+
+#include "CMPI/CMPIAdapter.h"
+#include "CMPI/CMPIAssignmentSettingData.h"
+#include "CMPI/CMPIIPComputerSystem.h"
+#include "CMPI/CMPIIPLanEndPoint.h"
+#include "IPInterfaceProvider.h"
+#include "Nx/Moniker.h"
+#include "Nx/ProviderUtilities.h"
+#include "Trace.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+// One end of an association class.
+struct AssociationEnd {
+    unsigned short classId;       // the class of a source path that is this end
+    const char* className;        // the class the located paths of this end are made of
+    const char* parentClassName;  // its direct CIM parent; with className, the accepted result classes
+    const char* referenceName;    // the association's reference to this end
+};
+
+struct AssociationClass {
+    const char* className;
+    unsigned short classId;
+    AssociationEnd a;
+    AssociationEnd b;
+    bool bReferenceFirst;  // the object path carries b's reference before a's
+};
+
+enum class Side { None, A, B };
+
+// Positioning an end adapter on a path (a located one or the request's own). The assignment
+// setting adapter is positioned exactly; the computer system lookup takes the first system
+// enumerated; a LAN endpoint path with keys is fetched, a bare class path enumerated.
+inline void positionAt(CMPIAssignmentSettingData& end, const CMPIObjectPath* path) { end.setObjectPath(path, false); }
+inline void positionAt(CMPIIPComputerSystem& end, const CMPIObjectPath* path) { end.setObjectPath(path, false); }
+inline void positionAt(CMPIIPLanEndPoint& end, const CMPIObjectPath* path) {
+    if (ProviderUtilities::getKeyCount(path) != 0)
+        end.setSingleObjectPath(path);
+    else
+        end.setObjectPath(path);
+}
+template <class End>
+void positionAt(End& end, const CMPIObjectPath* path) {
+    end.setObjectPath(path);
+}
+
+// Whether an end adapter stands on an element. The computer system lookup is asked for its path,
+// since its operator bool consumes the initial-load state that its iteration relies on.
+inline bool standsOnElement(CMPIIPComputerSystem& end) { return end.getObjectPath() != nullptr; }
+template <class End>
+bool standsOnElement(End& end) {
+    return static_cast<bool>(end);
+}
+
+template <class Derived, class Model, class EndA, class EndB>
+class CMPIAssociationAdapter {
+public:
+    CMPIAssociationAdapter(const CMPIAssociationAdapter&) = delete;
+    CMPIAssociationAdapter& operator=(const CMPIAssociationAdapter&) = delete;
+
+    explicit operator bool() {
+        enter(__func__, __LINE__);
+        bool current = false;
+        if (walked == Side::A) current = static_cast<bool>(endA);
+        if (walked == Side::B) current = static_cast<bool>(endB);
+        leave(__func__, __LINE__);
+        return current;
+    }
+
+    void operator++() {
+        enter(__func__, __LINE__);
+        if (walked == Side::A) ++endA;
+        if (walked == Side::B) ++endB;
+        leave(__func__, __LINE__);
+    }
+
+    // True when resultClass can never be the class of the far end. Only the far end's own class
+    // and its direct CIM parent are accepted, in any case. resultClass must not be null.
+    bool isNotTargetClass(const char* resultClass) const {
+        const std::string params = parameterList(" resultClass=", resultClass);
+        enter(__func__, __LINE__, params);
+        bool notTarget = true;
+        if (const AssociationEnd* far = farEnd())
+            notTarget = ::strcasecmp(resultClass, far->className) != 0 &&
+                        ::strcasecmp(resultClass, far->parentClassName) != 0;
+        leave(__func__, __LINE__, params);
+        return notTarget;
+    }
+
+    // The far end's current element; null when the source was not one of the ends.
+    CMPIObjectPath* getAssociatorNames() {
+        enter(__func__, __LINE__);
+        CMPIObjectPath* path = nullptr;
+        if (requestedClassId == association.a.classId) path = endB.getObjectPath();
+        if (requestedClassId == association.b.classId) path = endA.getObjectPath();
+        leave(__func__, __LINE__);
+        return path;
+    }
+
+    CMPIInstance* getAssociator(const char** properties) {
+        const std::string params = parameterList(" properties=", properties);
+        enter(__func__, __LINE__, params);
+        CMPIInstance* instance = nullptr;
+        if (requestedClassId == association.a.classId) instance = endB.getCMPIInstance(properties);
+        if (requestedClassId == association.b.classId) instance = endA.getCMPIInstance(properties);
+        leave(__func__, __LINE__, params);
+        return instance;
+    }
+
+    // A path of the association class with its two references to the current pair.
+    CMPIObjectPath* getObjectPath() {
+        enter(__func__, __LINE__);
+        CMPIObjectPath* path = ProviderUtilities::createObjectPath(broker, association.className, nameSpace);
+        if (path) {
+            CMPIObjectPath* toA = endA.getObjectPath();
+            CMPIObjectPath* toB = endB.getObjectPath();
+            if (association.bReferenceFirst) ProviderUtilities::setKeyProperty(path, association.b.referenceName, toB);
+            ProviderUtilities::setKeyProperty(path, association.a.referenceName, toA);
+            if (!association.bReferenceFirst) ProviderUtilities::setKeyProperty(path, association.b.referenceName, toB);
+        }
+        leave(__func__, __LINE__);
+        return path;
+    }
+
+    // The association instance: its references and its own properties.
+    CMPIInstance* getCMPIInstance(const char** properties) {
+        const std::string params = parameterList(" properties=", properties);
+        enter(__func__, __LINE__, params);
+        CMPIObjectPath* path = getObjectPath();
+        CMPIInstance* instance = ProviderUtilities::createInstance(broker, path);
+        if (instance) {
+            for (const char* reference : {association.a.referenceName, association.b.referenceName}) {
+                CMPIObjectPath* target = nullptr;
+                if (ProviderUtilities::getKeyProperty(path, reference, target))
+                    ProviderUtilities::setProperty(instance, reference, target);
+            }
+            static_cast<Derived*>(this)->setAssociationProperties(instance);
+        }
+        leave(__func__, __LINE__, params);
+        return instance;
+    }
+
+protected:
+    CMPIAssociationAdapter(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path,
+                           const AssociationClass& association_, const std::string& logger_, const char* file_)
+        : broker(broker_), context(context_), nameSpace(ProviderUtilities::getNamespace(path)), model(),
+          requestedClassId(ProviderUtilities::getClassId(path)), endA(broker_, context_, nameSpace),
+          endB(broker_, context_, nameSpace), association(association_), logger(logger_), file(file_) {
+        logRecord(logger, "CMPIAssociationAdapter", file, __LINE__, 4000,
+                  trace("requestedClassId", file, __LINE__, static_cast<unsigned>(requestedClassId)));
+    }
+    ~CMPIAssociationAdapter() = default;
+
+    // No properties of its own unless the association has some.
+    void setAssociationProperties(CMPIInstance*) {}
+
+    // A class path of farClass for the far end of source. When source has keys, the model
+    // converts its moniker into the far end's keys; without keys the bare class path stands for
+    // every element of the far class. The model's exceptions pass.
+    template <class Convert>
+    CMPIObjectPath* locate(const CMPIObjectPath* source, const char* farClass, Convert convert,
+                           const char* conversion) {
+        const std::string params = parameterList(" objectPath=", source, " farClass=", farClass);
+        enter(__func__, __LINE__, params);
+        CMPIObjectPath* far = ProviderUtilities::createObjectPath(broker, farClass, nameSpace);
+        if (ProviderUtilities::getKeyCount(source) != 0) {
+            Nx::Moniker moniker = ProviderUtilities::transformObjectPathToMoniker(source);
+            Nx::Moniker located = std::invoke(convert, model, moniker);
+            logRecord(logger, __func__, file, __LINE__, 3000,
+                      trace(file, (std::string("Returned from ") + conversion).c_str(), __LINE__, FREE_MESSAGE));
+            if (far) ProviderUtilities::transformMonikerToObjectPath(located, far);
+        }
+        leave(__func__, __LINE__, params);
+        return far;
+    }
+
+    // The source is end A: B is located from it and walked.
+    template <class LocateB>
+    void fromA(const CMPIObjectPath* path, LocateB locateB) {
+        positionAt(endB, std::invoke(locateB, derived(), path));
+        positionAt(endA, path);
+        walked = Side::B;
+    }
+    // The source is end B: A is located from it and walked.
+    template <class LocateA>
+    void fromB(const CMPIObjectPath* path, LocateA locateA) {
+        positionAt(endA, std::invoke(locateA, derived(), path));
+        positionAt(endB, path);
+        walked = Side::A;
+    }
+    // The association class: end A is walked, B is located from A's first element.
+    template <class LocateB>
+    void walkA(LocateB locateB) {
+        if (endA) positionAt(endB, std::invoke(locateB, derived(), endA.getObjectPath()));
+        walked = Side::A;
+    }
+    template <class LocateA>
+    void walkB(LocateA locateA) {
+        if (endB) positionAt(endA, std::invoke(locateA, derived(), endB.getObjectPath()));
+        walked = Side::B;
+    }
+    void walk(Side side) { walked = side; }
+
+    // The association class, for the associations anchored on one element (the computer system
+    // hosting endpoints, say). A path without keys: the anchor end is enumerated and the member
+    // end located from its first element and walked; true. A path with keys (one association
+    // instance): the member end is positioned on the member reference and the anchor located from
+    // it; when the anchor reference names the same anchor (identityKey of both), the anchor end is
+    // positioned on it. False: the caller goes on as for its fallback source class.
+    template <Side AnchorSide, class LocateMember, class LocateAnchor>
+    bool setAnchoredObjectPath(const CMPIObjectPath* path, const char* identityKey, LocateMember locateMember,
+                               LocateAnchor locateAnchor) {
+        constexpr Side MemberSide = AnchorSide == Side::A ? Side::B : Side::A;
+        auto& anchor = end<AnchorSide>();
+        auto& member = end<MemberSide>();
+        const AssociationEnd& anchorEnd = AnchorSide == Side::A ? association.a : association.b;
+        const AssociationEnd& memberEnd = AnchorSide == Side::A ? association.b : association.a;
+        const std::string params = parameterList(" objectPath=", path);
+        enter(__func__, __LINE__, params);
+        walked = MemberSide;
+        bool positioned = false;
+        if (ProviderUtilities::getKeyCount(path) == 0) {
+            positionAt(anchor, ProviderUtilities::createObjectPath(broker, anchorEnd.className, nameSpace));
+            if (standsOnElement(anchor))
+                positionAt(member, std::invoke(locateMember, derived(), anchor.getObjectPath()));
+            positioned = true;
+        } else {
+            CMPIObjectPath* memberReference = nullptr;
+            CMPIObjectPath* located = nullptr;
+            if (ProviderUtilities::getKeyProperty(path, memberEnd.referenceName, memberReference)) {
+                positionAt(member, memberReference);
+                located = std::invoke(locateAnchor, derived(), memberReference);
+            }
+            CMPIObjectPath* anchorReference = nullptr;
+            std::string given, expected;
+            if (ProviderUtilities::getKeyProperty(path, anchorEnd.referenceName, anchorReference) &&
+                ProviderUtilities::getKeyProperty(anchorReference, identityKey, given) &&
+                ProviderUtilities::getKeyProperty(located, identityKey, expected) && given == expected)
+                positionOnAnchor(anchor, anchorReference);
+        }
+        leave(__func__, __LINE__, params);
+        return positioned;
+    }
+
+    const CMPIBroker* broker;
+    const CMPIContext* context;
+    std::string nameSpace;
+    Model model;
+    unsigned short requestedClassId;
+    EndA endA;
+    EndB endB;
+
+private:
+    Derived& derived() { return static_cast<Derived&>(*this); }
+
+    template <Side S>
+    auto& end() {
+        if constexpr (S == Side::A)
+            return endA;
+        else
+            return endB;
+    }
+
+    // An anchor named by an association instance: a computer system is picked out by name.
+    static void positionOnAnchor(CMPIIPComputerSystem& anchor, const CMPIObjectPath* path) {
+        anchor.setObjectPath(path, true);
+    }
+    template <class Anchor>
+    static void positionOnAnchor(Anchor& anchor, const CMPIObjectPath* path) {
+        positionAt(anchor, path);
+    }
+
+    const AssociationEnd* farEnd() const {
+        if (requestedClassId == association.a.classId) return &association.b;
+        if (requestedClassId == association.b.classId) return &association.a;
+        return nullptr;
+    }
+
+    void enter(const char* function, int line, const std::string& params = std::string()) const {
+        logRecord(logger, function, file, line, params.empty() ? 4000 : 3000,
+                  params.empty() ? trace(file, function, line, ENTERING)
+                                 : tracepara(file, function, line, params.c_str(), ENTERING));
+    }
+    void leave(const char* function, int line, const std::string& params = std::string()) const {
+        logRecord(logger, function, file, line, params.empty() ? 4000 : 3000,
+                  params.empty() ? trace(file, function, line, EXITING)
+                                 : tracepara(file, function, line, params.c_str(), EXITING));
+    }
+
+    const AssociationClass& association;
+    Side walked = Side::None;
+    const std::string& logger;
+    const char* file;
+};
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx
