@@ -7,11 +7,22 @@
 #include <exception>
 
 #include "CMPI/CMPIAssignmentSettingData.h"
+#include "CMPI/CMPIBindsToLanEndpoint.h"
 #include "CMPI/CMPIIPConfigurationService.h"
+#include "CMPI/CMPIIPElementCapabilities.h"
+#include "CMPI/CMPIIPElementSettingData.h"
 #include "CMPI/CMPIIPEnabledLogicalElementCapabilities.h"
+#include "CMPI/CMPIIPHostedAccessPoint.h"
+#include "CMPI/CMPIIPHostedService.h"
 #include "CMPI/CMPIProtocolEndpoint.h"
+#include "CMPI/CMPIRemoteAccessAvailableToElement.h"
+#include "CMPI/CMPIRemoteHostedAccessPoint.h"
 #include "CMPI/CMPIRemoteServiceAccessPoint.h"
+#include "CMPI/CMPISPHostedAccessPoint.h"
+#include "CMPI/CMPIServiceAffectsElement.h"
+#include "CMPI/CMPIStaticElementSettingData.h"
 #include "CMPI/CMPIStaticIPAssignmentSettingData.h"
+#include "CMPI/CMPIStaticOrderedComponent.h"
 #include "Nx/ProviderUtilities.h"
 #include "Trace.h"
 
@@ -50,8 +61,74 @@ namespace {
 
 const char* orEmpty(const char* text) { return text ? text : ""; }
 
-// Builds the instance adapter that serves classId over cop and hands it to use.
-// False when no instance adapter serves the class.
+// Builds the association adapter that serves classId over cop (the request's source object) and
+// hands it to use. False when classId is not an association.
+template <class Use>
+bool withAssociationAdapter(unsigned short classId, const CMPIContext* ctx, const CMPIObjectPath* cop, Use&& use) {
+    switch (classId) {
+    case BindsToLanEndPointId: {
+        CMPIBindsToLanEndpoint adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPElementSettingDataId: {
+        CMPIIPElementSettingData adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case StaticOrderedComponentId: {
+        CMPIStaticOrderedComponent adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPHostedAccessPointId: {
+        CMPIIPHostedAccessPoint adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case StaticIPElementSettingDataId: {
+        CMPIStaticElementSettingData adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case RemoteHostedAccessPointId: {
+        CMPIRemoteHostedAccessPoint adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPRemoteAccessAvailableToElementId: {
+        CMPIRemoteAccessAvailableToElement adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case SPHostedAccessPointId: {
+        CMPISPHostedAccessPoint adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPElementCapabilitiesId: {
+        CMPIIPElementCapabilities adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPHostedServiceId: {
+        CMPIIPHostedService adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    case IPServiceAffectsElementId: {
+        CMPIServiceAffectsElement adapter(broker, ctx, cop);
+        use(adapter);
+        return true;
+    }
+    default:
+        return false;
+    }
+}
+
+// Builds the instance adapter that serves classId over cop and hands it to use; the association
+// classes are enumerated (and got) through their association adapters over the class path.
+// False when no adapter serves the class.
 template <class Use>
 bool withInstanceAdapter(unsigned short classId, const CMPIContext* ctx, const CMPIObjectPath* cop, Use&& use) {
     switch (classId) {
@@ -86,7 +163,7 @@ bool withInstanceAdapter(unsigned short classId, const CMPIContext* ctx, const C
         return true;
     }
     default:
-        return false;
+        return withAssociationAdapter(classId, ctx, cop, use);
     }
 }
 
@@ -119,8 +196,24 @@ bool withModifiableAdapter(unsigned short classId, const CMPIContext* ctx, const
     }
 }
 
-// The association classes whose adapters are built; none yet.
-bool isServedAssociation(unsigned short) { return false; }
+bool isServedAssociation(unsigned short classId) {
+    switch (classId) {
+    case BindsToLanEndPointId:
+    case IPElementSettingDataId:
+    case StaticOrderedComponentId:
+    case IPHostedAccessPointId:
+    case StaticIPElementSettingDataId:
+    case RemoteHostedAccessPointId:
+    case IPRemoteAccessAvailableToElementId:
+    case SPHostedAccessPointId:
+    case IPElementCapabilitiesId:
+    case IPHostedServiceId:
+    case IPServiceAffectsElementId:
+        return true;
+    default:
+        return false;
+    }
+}
 
 // A null instance or path (the broker could not build one) is not handed on: an object manager
 // would have to cope with it, and some do not.
@@ -298,8 +391,9 @@ CMPIStatus IPInterface_ExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPI
     return status;
 }
 
-CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext*, const CMPIResult* rslt,
-                                  const CMPIObjectPath*, const char* resultClass, const char*, const char**) {
+CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
+                                  const CMPIObjectPath* cop, const char* resultClass, const char*,
+                                  const char** properties) {
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     try {
@@ -309,7 +403,13 @@ CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext*, const 
         if (!isServedAssociation(classId)) {
             status.rc = CMPI_RC_ERR_INVALID_CLASS;
         } else {
-            CMReturnDone(rslt);
+            withAssociationAdapter(classId, ctx, cop, [&](auto& adapter) {
+                while (adapter) {
+                    returnInstance(rslt, adapter.getCMPIInstance(properties));
+                    ++adapter;
+                }
+                CMReturnDone(rslt);
+            });
         }
     } catch (const std::exception& e) {
         logCaught(e);
@@ -318,8 +418,8 @@ CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext*, const 
     return status;
 }
 
-CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext*, const CMPIResult* rslt,
-                                      const CMPIObjectPath*, const char* resultClass, const char*) {
+CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
+                                      const CMPIObjectPath* cop, const char* resultClass, const char*) {
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     try {
@@ -329,7 +429,13 @@ CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext*, co
         if (!isServedAssociation(classId)) {
             status.rc = CMPI_RC_ERR_INVALID_CLASS;
         } else {
-            CMReturnDone(rslt);
+            withAssociationAdapter(classId, ctx, cop, [&](auto& adapter) {
+                while (adapter) {
+                    returnObjectPath(rslt, adapter.getObjectPath());
+                    ++adapter;
+                }
+                CMReturnDone(rslt);
+            });
         }
     } catch (const std::exception& e) {
         logCaught(e);
@@ -341,11 +447,11 @@ CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext*, co
 namespace {
 
 // The shared walk of associators and associator names over the identifiers the association class
-// expands to. An association class the provider does not know gives success and no results.
-template <class PerId>
-CMPIStatus associatorWalk(const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
-                          const CMPIResult* rslt, PerId&& perId) {
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
+// expands to. An association class the provider does not know gives success and no results. The
+// status is the caller's, so that what the walk set stands when an adapter throws.
+template <class PerElement>
+void associatorWalk(CMPIStatus& status, const CMPIContext* ctx, const CMPIObjectPath* cop, const char* assocClass,
+                    const char* resultClass, const CMPIResult* rslt, PerElement&& perElement) {
     NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
     NX_VAR(loggerIPInterfaceProvider, "associationClass", orEmpty(assocClass));
     std::vector<unsigned short> ids;
@@ -356,23 +462,30 @@ CMPIStatus associatorWalk(const CMPIObjectPath* cop, const char* assocClass, con
         if (!isServedAssociation(id)) {
             status.rc = CMPI_RC_ERR_INVALID_CLASS;
         } else {
-            perId(id);
+            withAssociationAdapter(id, ctx, cop, [&](auto& adapter) {
+                // An empty result class filters as little as none.
+                if (resultClass && *resultClass && adapter.isNotTargetClass(resultClass)) return;
+                while (adapter) {
+                    perElement(adapter);
+                    ++adapter;
+                }
+            });
         }
         NX_VAR(loggerIPInterfaceProvider, "rcode", static_cast<unsigned>(status.rc));
     }
     CMReturnDone(rslt);
-    return status;
 }
 
 }  // namespace
 
-CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext*, const CMPIResult* rslt,
+CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                    const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
-                                   const char*, const char*, const char**) {
+                                   const char*, const char*, const char** properties) {
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     try {
-        status = associatorWalk(cop, assocClass, resultClass, rslt, [&](unsigned short) {});
+        associatorWalk(status, ctx, cop, assocClass, resultClass, rslt,
+                       [&](auto& adapter) { returnInstance(rslt, adapter.getAssociator(properties)); });
     } catch (const std::exception& e) {
         logCaught(e);
     }
@@ -380,13 +493,14 @@ CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext*, const
     return status;
 }
 
-CMPIStatus IPInterface_AssociatorNames(CMPIAssociationMI*, const CMPIContext*, const CMPIResult* rslt,
+CMPIStatus IPInterface_AssociatorNames(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                        const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
                                        const char*, const char*) {
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     try {
-        status = associatorWalk(cop, assocClass, resultClass, rslt, [&](unsigned short) {});
+        associatorWalk(status, ctx, cop, assocClass, resultClass, rslt,
+                       [&](auto& adapter) { returnObjectPath(rslt, adapter.getAssociatorNames()); });
     } catch (const std::exception& e) {
         logCaught(e);
     }

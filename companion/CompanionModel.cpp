@@ -92,11 +92,7 @@ Reference endpointOf(const HostPicture& host, const Interface& iface, const char
                       {"Name", iface.name}}};
 }
 
-// The InstanceIDs of an interface's settings. A client applies a configuration by the InstanceID
-// of one of its IP assignment settings ("Computer%eth0%static", "Computer%eth0%dhcp"); the method
-// takes every setting whose InstanceID that name contains, so the DHCP setting is the DHCP name
-// itself and the DNS setting the stem both names share, up to and with the closing '%' (which
-// keeps eth0's stem out of eth01's names).
+// The closing '%' of the DNS stem keeps eth0's setting out of eth01's configuration names.
 std::string dhcpSettingId(const Interface& iface) { return iface.settingPrefix + iface.name + "%dhcp"; }
 std::string dnsSettingId(const Interface& iface) { return iface.settingPrefix + iface.name + "%"; }
 const char* const kDNSGeneralSettingId = "Computer%dnsgeneral";
@@ -127,11 +123,12 @@ std::vector<Object> serviceProcessors(const HostPicture& host, Settings&) {
 std::vector<Object> lanEndpoints(const HostPicture& host, Settings&) {
     std::vector<Object> objects;
     for (const LanPort& port : host.lanPorts) {
-        objects.push_back(Object{"KVRNX_LANEndpoint",
-                                 {text("SystemCreationClassName", kComputerSystem),
-                                  text("SystemName", port.underServiceProcessor ? kServiceProcessorName : host.hostName),
-                                  text("CreationClassName", "KVRNX_LANEndpoint"), text("Name", port.name)},
-                                 {text("ElementName", port.name), number("ProtocolIFType", 6)}});  // Ethernet
+        objects.push_back(
+            Object{"KVRNX_LANEndpoint",
+                   {text("SystemCreationClassName", kComputerSystem),
+                    text("SystemName", port.underServiceProcessor ? kServiceProcessorName : host.hostName),
+                    text("CreationClassName", "KVRNX_LANEndpoint"), text("Name", port.name)},
+                   {text("ElementName", port.name), number("ProtocolIFType", 6)}});  // Ethernet
     }
     return objects;
 }
@@ -288,7 +285,7 @@ std::string Settings::format(const Entries& entries) {
 }
 
 std::optional<std::vector<std::string>> Settings::valueOr(const std::string& id, const std::string& property,
-                                                           const std::optional<std::vector<std::string>>& hostValue) {
+                                                          const std::optional<std::vector<std::string>>& hostValue) {
     auto setting = entries_.find(id);
     if (setting == entries_.end()) return hostValue;
     auto stored = setting->second.find(property);
@@ -324,25 +321,29 @@ bool Settings::forgetStale() {
     return written || declined;
 }
 
-const std::vector<ClassEntry>& classTable() {
-    static const std::vector<ClassEntry> table = {
-        {kComputerSystem, false, computerSystems, {}},
-        {kServiceProcessor, false, serviceProcessors, {}},
-        {"KVRNX_LANEndpoint", false, lanEndpoints, {}},
-        {"KVRNX_DHCPSettingData", false, dhcpSettings, {{"ConfigurationName", false, true, kAnyExtra}}},
-        {"KVRNX_DNSSettingData", false, dnsSettings,
-         {{"RequestedHostname", false, false, "-_"},
-          {"DomainName", false, false, "-_"},
-          {"DNSServerAddresses", true, false, ":%"},
-          {"ConfigurationName", false, true, kAnyExtra}}},
-        {"KVRNX_DNSGeneralSettingData", false, dnsGeneralSettings,
-         {{"DNSSuffixesToAppend", true, false, "-_"}, {"ConfigurationName", false, true, kAnyExtra}}},
-        {kDNSEndpoint, false, dnsEndpoints, {}},
-        {"KVRNX_DNSSAPSAPDependency", true, dnsDependencies, {}},
-        {"KVRNX_ConcreteJob", false, jobs, {}},
-    };
-    return table;
-}
+// Built when the library is loaded, before any request thread can look at it.
+const std::vector<ClassEntry> kClassTable = {
+    {kComputerSystem, false, computerSystems, {}},
+    {kServiceProcessor, false, serviceProcessors, {}},
+    {"KVRNX_LANEndpoint", false, lanEndpoints, {}},
+    {"KVRNX_DHCPSettingData", false, dhcpSettings, {{"ConfigurationName", false, true, kAnyExtra}}},
+    {"KVRNX_DNSSettingData",
+     false,
+     dnsSettings,
+     {{"RequestedHostname", false, false, "-_"},
+      {"DomainName", false, false, "-_"},
+      {"DNSServerAddresses", true, false, ":%"},
+      {"ConfigurationName", false, true, kAnyExtra}}},
+    {"KVRNX_DNSGeneralSettingData",
+     false,
+     dnsGeneralSettings,
+     {{"DNSSuffixesToAppend", true, false, "-_"}, {"ConfigurationName", false, true, kAnyExtra}}},
+    {kDNSEndpoint, false, dnsEndpoints, {}},
+    {"KVRNX_DNSSAPSAPDependency", true, dnsDependencies, {}},
+    {"KVRNX_ConcreteJob", false, jobs, {}},
+};
+
+const std::vector<ClassEntry>& classTable() { return kClassTable; }
 
 const ClassEntry* findClass(const std::string& className) {
     for (const ClassEntry& entry : classTable())

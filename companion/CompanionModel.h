@@ -1,5 +1,17 @@
 // The companion provider's view of the host: the classes the IP interface provider meets at the far
 // end of its associations or reads while applying a setting, produced from the host model.
+//
+// Setting InstanceIDs, with P "Computer%" ("BMC%" for the service processor's interfaces):
+//   KVRNX_DHCPSettingData         P<if>%dhcp
+//   KVRNX_DNSSettingData          P<if>%
+//   KVRNX_DNSGeneralSettingData   Computer%dnsgeneral (one per host)
+// A client applies P<if>%static or P<if>%dhcp (the interface's IP assignment settings); the
+// configuration service takes each setting whose InstanceID that name contains, so either name
+// brings the interface's DNS setting with it, and only the DHCP name its DHCP setting.
+//
+// ModifyInstance of the DHCP and DNS settings does not touch the host: the values wait in
+// <data directory>/kvrnx-companion.settings and are what the settings show and what applying
+// them writes. A value is dropped once the host reports it, so the setting follows the host again.
 #pragma once
 
 #include <map>
@@ -18,8 +30,8 @@ struct Reference {
     std::vector<std::pair<std::string, std::string>> keys;
 };
 
-using Value = std::variant<std::string, unsigned short, std::vector<std::string>, std::vector<unsigned short>,
-                           Reference>;
+using Value =
+    std::variant<std::string, unsigned short, std::vector<std::string>, std::vector<unsigned short>, Reference>;
 
 struct Property {
     std::string name;
@@ -41,16 +53,16 @@ struct Interface {
 };
 
 struct LanPort {
-    std::string name;           // property 108
+    std::string name;  // property 108
     bool underServiceProcessor;
 };
 
 // What one request needs of the host, read once.
 struct HostPicture {
-    std::string hostName;  // gethostname, as the IP interface provider reports SystemName
-    std::optional<std::string> modelHostName;  // system node 97
-    std::optional<std::string> domainName;     // 98
-    std::optional<std::vector<std::string>> dnsServers;   // 94
+    std::string hostName;                                // gethostname, as the IP interface provider reports SystemName
+    std::optional<std::string> modelHostName;            // system node 97
+    std::optional<std::string> domainName;               // 98
+    std::optional<std::vector<std::string>> dnsServers;  // 94
     std::optional<std::vector<std::string>> dnsSuffixes;  // 99
     bool hasServiceProcessor = false;
     std::string serviceProcessorDescription;

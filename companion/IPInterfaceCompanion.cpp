@@ -105,7 +105,8 @@ void setProperty(CMPIInstance* instance, const std::string& ns, const Property& 
 CMPIInstance* makeInstance(const std::string& ns, const Object& object, const char** properties) {
     CMPIStatus st = {CMPI_RC_OK, nullptr};
     CMPIInstance* instance = CMNewInstance(broker(), makePath(ns, object.className, object.keys), &st);
-    if (!instance || st.rc != CMPI_RC_OK) throw ProviderException("Could not create an instance of " + object.className);
+    if (!instance || st.rc != CMPI_RC_OK)
+        throw ProviderException("Could not create an instance of " + object.className);
     if (properties) CMSetPropertyFilter(instance, properties, nullptr);
     for (const Property& key : object.keys) setProperty(instance, ns, key);
     for (const Property& property : object.properties) setProperty(instance, ns, property);
@@ -116,8 +117,7 @@ CMPIInstance* makeInstance(const std::string& ns, const Object& object, const ch
 
 bool isCreationClassKey(const std::string& name) {
     const std::string suffix = "CreationClassName";
-    return name.size() >= suffix.size() &&
-           equalsIgnoreCase(name.substr(name.size() - suffix.size()), suffix);
+    return name.size() >= suffix.size() && equalsIgnoreCase(name.substr(name.size() - suffix.size()), suffix);
 }
 
 bool pathMatches(const CMPIObjectPath* path, const std::vector<Property>& keys, bool allKeys);
@@ -214,7 +214,8 @@ CMPIStatus Cleanup(CMPIInstanceMI*, const CMPIContext*, CMPIBoolean) { return st
 
 CMPIStatus EnumInstanceNames(CMPIInstanceMI*, const CMPIContext*, const CMPIResult* rslt, const CMPIObjectPath* op) {
     return withClass(__func__, op, [&](const ClassEntry& entry, const std::string& ns) {
-        for (const Object& object : objectsOf(entry)) CMReturnObjectPath(rslt, makePath(ns, object.className, object.keys));
+        for (const Object& object : objectsOf(entry))
+            CMReturnObjectPath(rslt, makePath(ns, object.className, object.keys));
         CMReturnDone(rslt);
         return status(CMPI_RC_OK);
     });
@@ -437,13 +438,23 @@ CMPIStatus ReferenceNames(CMPIAssociationMI*, const CMPIContext*, const CMPIResu
 }
 
 CMPIInstanceMIFT instanceFT = {
-    CMPICurrentVersion, CMPICurrentVersion, "instanceIPInterfaceCompanion",
-    Cleanup, EnumInstanceNames, EnumInstances, GetInstance, CreateInstance, ModifyInstance, DeleteInstance, ExecQuery,
+    CMPICurrentVersion,
+    CMPICurrentVersion,
+    "instanceIPInterfaceCompanion",
+    Cleanup,
+    EnumInstanceNames,
+    EnumInstances,
+    GetInstance,
+    CreateInstance,
+    ModifyInstance,
+    DeleteInstance,
+    ExecQuery,
 };
 
 CMPIAssociationMIFT associationFT = {
     CMPICurrentVersion, CMPICurrentVersion, "associationIPInterfaceCompanion",
-    AssociationCleanup, Associators, AssociatorNames, References, ReferenceNames,
+    AssociationCleanup, Associators,        AssociatorNames,
+    References,         ReferenceNames,
 };
 
 }  // namespace

@@ -20,6 +20,7 @@
 #include <strings.h>
 
 #include <functional>
+#include <initializer_list>
 #include <string>
 
 #include "CMPI/CMPIAdapter.h"
@@ -177,6 +178,14 @@ protected:
 
     // No properties of its own unless the association has some.
     void setAssociationProperties(CMPIInstance*) {}
+
+    // Sets a property of the association from the model's getter; left unset when the getter
+    // reports failure.
+    template <class Value, class Getter>
+    void copyProperty(CMPIInstance* instance, const char* name, Getter getter) {
+        Value value{};
+        if (std::invoke(getter, model, value)) ProviderUtilities::setProperty(instance, name, value);
+    }
 
     // A class path of farClass for the far end of source. When source has keys, the model
     // converts its moniker into the far end's keys; without keys the bare class path stands for

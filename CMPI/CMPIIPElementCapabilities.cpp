@@ -1,0 +1,48 @@
+#include "CMPI/CMPIIPElementCapabilities.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+static const std::string loggerCMPIIPElementCapabilities = "Tarvo.IPInterfaceProvider";
+
+namespace {
+
+const AssociationClass kAssociation = {
+    "KVRNX_IPElementCapabilities", IPElementCapabilitiesId,
+    {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "ManagedElement"},
+    {IPEnabledLogicalElementCapabilitiesId, "KVRNX_IPEnabledLogicalElementCapabilities", "CIM_EnabledLogicalElementCapabilities", "Capabilities"},
+    false,
+};
+
+}  // namespace
+
+CMPIIPElementCapabilities::CMPIIPElementCapabilities(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+    : Base(broker_, context_, path, kAssociation, loggerCMPIIPElementCapabilities, NX_FILE) {
+    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIIPElementCapabilities, params.c_str());
+    switch (requestedClassId) {
+        case IPElementCapabilitiesId:
+            walkA(&CMPIIPElementCapabilities::locateCapabilities);
+            break;
+        case IPEnabledLogicalElementCapabilitiesId:
+            fromB(path, &CMPIIPElementCapabilities::locateProtocolEndpt);
+            break;
+        case IPProtocolEndpointId:
+            fromA(path, &CMPIIPElementCapabilities::locateCapabilities);
+            break;
+        default:
+            break;
+    }
+    NX_EXIT_PARAMS(loggerCMPIIPElementCapabilities, params.c_str());
+}
+
+CMPIObjectPath* CMPIIPElementCapabilities::locateProtocolEndpt(const CMPIObjectPath* path) {
+    return locate(path, "KVRNX_IPProtocolEndpoint", &IPElementCapabilities::getIPMoniker, "getIPMoniker");
+}
+
+CMPIObjectPath* CMPIIPElementCapabilities::locateCapabilities(const CMPIObjectPath* path) {
+    return locate(path, "KVRNX_IPEnabledLogicalElementCapabilities", &IPElementCapabilities::getCapabilitiesMoniker, "getCapabilitiesMoniker");
+}
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx

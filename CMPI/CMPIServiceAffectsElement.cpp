@@ -1,0 +1,52 @@
+#include "CMPI/CMPIServiceAffectsElement.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+static const std::string loggerCMPIServiceAffectsElement = "Tarvo.IPInterfaceProvider";
+
+namespace {
+
+const AssociationClass kAssociation = {
+    "KVRNX_IPServiceAffectsElement", IPServiceAffectsElementId,
+    {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "AffectedElement"},
+    {IPConfigurationServiceId, "KVRNX_IPConfigurationService", "CIM_IPConfigurationService", "AffectingElement"},
+    false,
+};
+
+}  // namespace
+
+CMPIServiceAffectsElement::CMPIServiceAffectsElement(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+    : Base(broker_, context_, path, kAssociation, loggerCMPIServiceAffectsElement, NX_FILE) {
+    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIServiceAffectsElement, params.c_str());
+    switch (requestedClassId) {
+        case IPConfigurationServiceId:
+            fromB(path, &CMPIServiceAffectsElement::locateIPEndptPath);
+            break;
+        case IPServiceAffectsElementId:
+            if (!setObjectPath(path)) fromA(path, &CMPIServiceAffectsElement::locateIPConfgSvce);
+            break;
+        case IPProtocolEndpointId:
+            fromA(path, &CMPIServiceAffectsElement::locateIPConfgSvce);
+            break;
+        default:
+            break;
+    }
+    NX_EXIT_PARAMS(loggerCMPIServiceAffectsElement, params.c_str());
+}
+
+bool CMPIServiceAffectsElement::setObjectPath(const CMPIObjectPath* path) {
+    return setAnchoredObjectPath<Side::B>(path, "SystemName", &CMPIServiceAffectsElement::locateIPEndptPath, &CMPIServiceAffectsElement::locateIPConfgSvce);
+}
+
+CMPIObjectPath* CMPIServiceAffectsElement::locateIPEndptPath(const CMPIObjectPath* path) {
+    return locate(path, "KVRNX_IPProtocolEndpoint", &ServiceAffectsElement::getIPProtocolEndpointMoniker, "getIPProtocolEndpointMoniker");
+}
+
+CMPIObjectPath* CMPIServiceAffectsElement::locateIPConfgSvce(const CMPIObjectPath* path) {
+    return locate(path, "KVRNX_IPConfigurationService", &ServiceAffectsElement::getIPConfigurationServiceMoniker, "getIPConfigurationServiceMoniker");
+}
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx

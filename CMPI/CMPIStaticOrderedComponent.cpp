@@ -1,0 +1,56 @@
+#include "CMPI/CMPIStaticOrderedComponent.h"
+
+namespace Nx {
+namespace IPInterfaceProvider {
+
+static const std::string loggerCMPIStaticOrderedComponent = "Tarvo.IPInterfaceProvider";
+
+namespace {
+
+const AssociationClass kAssociation = {
+    "KVRNX_StaticOrderedComponent", StaticOrderedComponentId,
+    {IPAssignmentSettingDataId, "KVRNX_IPAssignmentSettingData", "CIM_IPAssignmentSettingData", "GroupComponent"},
+    {StaticIPAssignmentSettingDataId, "KVRNX_StaticIPAssignmentSettingData", "CIM_StaticIPAssignmentSettingData", "PartComponent"},
+    true,
+};
+
+}  // namespace
+
+CMPIStaticOrderedComponent::CMPIStaticOrderedComponent(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+    : Base(broker_, context_, path, kAssociation, loggerCMPIStaticOrderedComponent, NX_FILE) {
+    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
+    NX_ENTER_PARAMS(loggerCMPIStaticOrderedComponent, params.c_str());
+    switch (requestedClassId) {
+        case StaticIPAssignmentSettingDataId:
+            fromB(path, &CMPIStaticOrderedComponent::locateAssignmentSetting);
+            break;
+        case StaticOrderedComponentId:
+            if (!setObjectPath(path)) fromA(path, &CMPIStaticOrderedComponent::locateStaticAssignmentSetting);
+            break;
+        case IPAssignmentSettingDataId:
+            fromA(path, &CMPIStaticOrderedComponent::locateStaticAssignmentSetting);
+            break;
+        default:
+            break;
+    }
+    NX_EXIT_PARAMS(loggerCMPIStaticOrderedComponent, params.c_str());
+}
+
+bool CMPIStaticOrderedComponent::setObjectPath(const CMPIObjectPath* path) {
+    return setAnchoredObjectPath<Side::A>(path, "InstanceID", &CMPIStaticOrderedComponent::locateStaticAssignmentSetting, &CMPIStaticOrderedComponent::locateAssignmentSetting);
+}
+
+CMPIObjectPath* CMPIStaticOrderedComponent::locateAssignmentSetting(const CMPIObjectPath* path) {
+    return locate(path, "KVRNX_IPAssignmentSettingData", &StaticOrderedComponent::getGroupComponentMoniker, "getGroupComponentMoniker");
+}
+
+CMPIObjectPath* CMPIStaticOrderedComponent::locateStaticAssignmentSetting(const CMPIObjectPath* path) {
+    return locate(path, "KVRNX_StaticIPAssignmentSettingData", &StaticOrderedComponent::getPartComponentMoniker, "getPartComponentMoniker");
+}
+
+void CMPIStaticOrderedComponent::setAssociationProperties(CMPIInstance* instance) {
+    copyProperty<unsigned long long>(instance, "AssignedSequence", &StaticOrderedComponent::getAssignedSequence);
+}
+
+}  // namespace IPInterfaceProvider
+}  // namespace Nx
