@@ -8,7 +8,8 @@ static const std::string loggerCMPIBindsToLanEndpoint = "Tarvo.IPInterfaceProvid
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_BindsToLanEndPoint", BindsToLanEndPointId,
+    "KVRNX_BindsToLanEndPoint",
+    BindsToLanEndPointId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "Dependent"},
     {LANEndpointId, "KVRNX_LANEndpoint", "CIM_LanEndpoint", "Antecedent"},
     false,
@@ -16,7 +17,8 @@ const AssociationClass kAssociation = {
 
 }  // namespace
 
-CMPIBindsToLanEndpoint::CMPIBindsToLanEndpoint(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIBindsToLanEndpoint::CMPIBindsToLanEndpoint(const CMPIBroker* broker_, const CMPIContext* context_,
+                                               const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIBindsToLanEndpoint, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIBindsToLanEndpoint, params.c_str());
@@ -39,7 +41,8 @@ CMPIBindsToLanEndpoint::CMPIBindsToLanEndpoint(const CMPIBroker* broker_, const 
 }
 
 CMPIObjectPath* CMPIBindsToLanEndpoint::getIPEndptPath(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPProtocolEndpoint", &BindsToLANEndpoint::getIPProtocolEndPointMoniker, "getIPProtocolEndPointMoniker");
+    return locate(path, "KVRNX_IPProtocolEndpoint", &BindsToLANEndpoint::getIPProtocolEndPointMoniker,
+                  "getIPProtocolEndPointMoniker");
 }
 
 CMPIObjectPath* CMPIBindsToLanEndpoint::getLanEndptPath(const CMPIObjectPath* path) {

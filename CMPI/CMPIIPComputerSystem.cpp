@@ -25,22 +25,25 @@ CMPIInstance* instanceOf(const CMPIData& data, const CMPIStatus& rc) {
 
 CMPIIPComputerSystem::CMPIIPComputerSystem(const CMPIBroker* broker_, const CMPIContext* context_,
                                            std::string nameSpace_)
-    : broker(broker_), context(context_), nameSpace(std::move(nameSpace_)), instance(nullptr),
-      enumeration(nullptr), initialLoad(false), findServiceProcessor(false) {
+    : broker(broker_),
+      context(context_),
+      nameSpace(std::move(nameSpace_)),
+      instance(nullptr),
+      enumeration(nullptr),
+      initialLoad(false),
+      findServiceProcessor(false) {
     const std::string params = parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
     NX_ENTER_PARAMS(loggerCMPIIPComputerSystem, params.c_str());
     NX_EXIT_PARAMS(loggerCMPIIPComputerSystem, params.c_str());
 }
 
 void CMPIIPComputerSystem::setObjectPath(const CMPIObjectPath* path, bool findServiceProcessor_) {
-    const std::string params =
-        parameterList(" objectPath=", path, " findServiceProcessor=", findServiceProcessor_);
+    const std::string params = parameterList(" objectPath=", path, " findServiceProcessor=", findServiceProcessor_);
     NX_ENTER_PARAMS(loggerCMPIIPComputerSystem, params.c_str());
     findServiceProcessor = findServiceProcessor_;
     CMPIStatus rc = {CMPI_RC_OK, nullptr};
     enumeration = broker ? CBEnumInstances(broker, context, path, nullptr, &rc) : nullptr;
-    if (!broker || rc.rc != CMPI_RC_OK)
-        throw Nx::ProviderException("Could not obtain an instance of Computer System");
+    if (!broker || rc.rc != CMPI_RC_OK) throw Nx::ProviderException("Could not obtain an instance of Computer System");
     if (!findServiceProcessor) {
         if (enumeration && CMHasNext(enumeration, nullptr)) {
             CMPIStatus next = {CMPI_RC_OK, nullptr};

@@ -177,7 +177,8 @@ CMPIUint32 CMPIIPConfigurationService::executeMethod(const CMPIArgs* in, CMPIArg
 
     // NetworkManager would undo whatever is written to the interface files.
     if (checkNetworkManagerStatus()) {
-        setStatus(CMPI_RC_ERR_FAILED, "Configuration Cannot be Applied since NetworkManager Tool is present in Endpoint");
+        setStatus(CMPI_RC_ERR_FAILED,
+                  "Configuration Cannot be Applied since NetworkManager Tool is present in Endpoint");
         freeRecord();
         return 4;
     }
@@ -214,7 +215,8 @@ CMPIUint32 CMPIIPConfigurationService::executeMethod(const CMPIArgs* in, CMPIArg
     return 0;
 }
 
-CMPIInstance* CMPIIPConfigurationService::getConfiguartionSetting(const char* className, const std::string& instanceId) {
+CMPIInstance* CMPIIPConfigurationService::getConfiguartionSetting(const char* className,
+                                                                  const std::string& instanceId) {
     const std::string params = parameterList(" className=", className, " instanceId=", instanceId);
     NX_ENTER_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
     const auto leave = [&](CMPIInstance* found) {

@@ -8,15 +8,18 @@ static const std::string loggerCMPIIPElementCapabilities = "Tarvo.IPInterfacePro
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_IPElementCapabilities", IPElementCapabilitiesId,
+    "KVRNX_IPElementCapabilities",
+    IPElementCapabilitiesId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "ManagedElement"},
-    {IPEnabledLogicalElementCapabilitiesId, "KVRNX_IPEnabledLogicalElementCapabilities", "CIM_EnabledLogicalElementCapabilities", "Capabilities"},
+    {IPEnabledLogicalElementCapabilitiesId, "KVRNX_IPEnabledLogicalElementCapabilities",
+     "CIM_EnabledLogicalElementCapabilities", "Capabilities"},
     false,
 };
 
 }  // namespace
 
-CMPIIPElementCapabilities::CMPIIPElementCapabilities(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIIPElementCapabilities::CMPIIPElementCapabilities(const CMPIBroker* broker_, const CMPIContext* context_,
+                                                     const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIIPElementCapabilities, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIIPElementCapabilities, params.c_str());
@@ -41,7 +44,8 @@ CMPIObjectPath* CMPIIPElementCapabilities::locateProtocolEndpt(const CMPIObjectP
 }
 
 CMPIObjectPath* CMPIIPElementCapabilities::locateCapabilities(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPEnabledLogicalElementCapabilities", &IPElementCapabilities::getCapabilitiesMoniker, "getCapabilitiesMoniker");
+    return locate(path, "KVRNX_IPEnabledLogicalElementCapabilities", &IPElementCapabilities::getCapabilitiesMoniker,
+                  "getCapabilitiesMoniker");
 }
 
 }  // namespace IPInterfaceProvider

@@ -8,7 +8,8 @@ static const std::string loggerCMPIIPElementSettingData = "Tarvo.IPInterfaceProv
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_IPElementSettingData", IPElementSettingDataId,
+    "KVRNX_IPElementSettingData",
+    IPElementSettingDataId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "ManagedElement"},
     {IPAssignmentSettingDataId, "KVRNX_IPAssignmentSettingData", "CIM_IPAssignmentSettingData", "SettingData"},
     true,
@@ -16,7 +17,8 @@ const AssociationClass kAssociation = {
 
 }  // namespace
 
-CMPIIPElementSettingData::CMPIIPElementSettingData(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIIPElementSettingData::CMPIIPElementSettingData(const CMPIBroker* broker_, const CMPIContext* context_,
+                                                   const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIIPElementSettingData, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIIPElementSettingData, params.c_str());
@@ -40,11 +42,13 @@ CMPIIPElementSettingData::CMPIIPElementSettingData(const CMPIBroker* broker_, co
 }
 
 CMPIObjectPath* CMPIIPElementSettingData::locateIPEndptPath(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPProtocolEndpoint", &IPElementSettingData::getManagedElementMoniker, "getManagedElementMoniker");
+    return locate(path, "KVRNX_IPProtocolEndpoint", &IPElementSettingData::getManagedElementMoniker,
+                  "getManagedElementMoniker");
 }
 
 CMPIObjectPath* CMPIIPElementSettingData::locateAssignSettingDataPath(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPAssignmentSettingData", &IPElementSettingData::getIPSettingDataMoniker, "getIPSettingDataMoniker");
+    return locate(path, "KVRNX_IPAssignmentSettingData", &IPElementSettingData::getIPSettingDataMoniker,
+                  "getIPSettingDataMoniker");
 }
 
 void CMPIIPElementSettingData::setAssociationProperties(CMPIInstance* instance) {

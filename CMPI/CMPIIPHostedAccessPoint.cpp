@@ -8,7 +8,8 @@ static const std::string loggerCMPIIPHostedAccessPoint = "Tarvo.IPInterfaceProvi
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_IPHostedAccessPoint", IPHostedAccessPointId,
+    "KVRNX_IPHostedAccessPoint",
+    IPHostedAccessPointId,
     {ComputerSystemId, "KVRNX_ComputerSystem", "CIM_ComputerSystem", "Antecedent"},
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "Dependent"},
     false,
@@ -16,7 +17,8 @@ const AssociationClass kAssociation = {
 
 }  // namespace
 
-CMPIIPHostedAccessPoint::CMPIIPHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIIPHostedAccessPoint::CMPIIPHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_,
+                                                 const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIIPHostedAccessPoint, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIIPHostedAccessPoint, params.c_str());
@@ -37,15 +39,18 @@ CMPIIPHostedAccessPoint::CMPIIPHostedAccessPoint(const CMPIBroker* broker_, cons
 }
 
 bool CMPIIPHostedAccessPoint::setObjectPath(const CMPIObjectPath* path) {
-    return setAnchoredObjectPath<Side::A>(path, "Name", &CMPIIPHostedAccessPoint::locateProtocolEndpoint, &CMPIIPHostedAccessPoint::locateComputer);
+    return setAnchoredObjectPath<Side::A>(path, "Name", &CMPIIPHostedAccessPoint::locateProtocolEndpoint,
+                                          &CMPIIPHostedAccessPoint::locateComputer);
 }
 
 CMPIObjectPath* CMPIIPHostedAccessPoint::locateComputer(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_ComputerSystem", &IPHostedAccessPoint::getComputerSystemMoniker, "getComputerSystemMoniker");
+    return locate(path, "KVRNX_ComputerSystem", &IPHostedAccessPoint::getComputerSystemMoniker,
+                  "getComputerSystemMoniker");
 }
 
 CMPIObjectPath* CMPIIPHostedAccessPoint::locateProtocolEndpoint(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPProtocolEndpoint", &IPHostedAccessPoint::getIPProtocolEndPointMoniker, "getIPProtocolEndPointMoniker");
+    return locate(path, "KVRNX_IPProtocolEndpoint", &IPHostedAccessPoint::getIPProtocolEndPointMoniker,
+                  "getIPProtocolEndPointMoniker");
 }
 
 }  // namespace IPInterfaceProvider

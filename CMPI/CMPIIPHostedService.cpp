@@ -8,7 +8,8 @@ static const std::string loggerCMPIIPHostedService = "Tarvo.IPInterfaceProvider"
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_IPHostedService", IPHostedServiceId,
+    "KVRNX_IPHostedService",
+    IPHostedServiceId,
     {ComputerSystemId, "KVRNX_ComputerSystem", "CIM_ComputerSystem", "Antecedent"},
     {IPConfigurationServiceId, "KVRNX_IPConfigurationService", "CIM_IPConfigurationService", "Dependent"},
     false,
@@ -16,7 +17,8 @@ const AssociationClass kAssociation = {
 
 }  // namespace
 
-CMPIIPHostedService::CMPIIPHostedService(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIIPHostedService::CMPIIPHostedService(const CMPIBroker* broker_, const CMPIContext* context_,
+                                         const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIIPHostedService, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIIPHostedService, params.c_str());
@@ -37,7 +39,8 @@ CMPIIPHostedService::CMPIIPHostedService(const CMPIBroker* broker_, const CMPICo
 }
 
 bool CMPIIPHostedService::setObjectPath(const CMPIObjectPath* path) {
-    return setAnchoredObjectPath<Side::A>(path, "Name", &CMPIIPHostedService::locateConfigurationService, &CMPIIPHostedService::locateComputer);
+    return setAnchoredObjectPath<Side::A>(path, "Name", &CMPIIPHostedService::locateConfigurationService,
+                                          &CMPIIPHostedService::locateComputer);
 }
 
 CMPIObjectPath* CMPIIPHostedService::locateComputer(const CMPIObjectPath* path) {
@@ -45,7 +48,8 @@ CMPIObjectPath* CMPIIPHostedService::locateComputer(const CMPIObjectPath* path) 
 }
 
 CMPIObjectPath* CMPIIPHostedService::locateConfigurationService(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPConfigurationService", &IPHostedService::getIPConfigurationServiceMoniker, "getIPConfigurationServiceMoniker");
+    return locate(path, "KVRNX_IPConfigurationService", &IPHostedService::getIPConfigurationServiceMoniker,
+                  "getIPConfigurationServiceMoniker");
 }
 
 }  // namespace IPInterfaceProvider

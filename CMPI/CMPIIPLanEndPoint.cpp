@@ -25,7 +25,11 @@ const char* const kLookupFailed = "Could not obtain an instance of Computer Syst
 }  // namespace
 
 CMPIIPLanEndPoint::CMPIIPLanEndPoint(const CMPIBroker* broker_, const CMPIContext* context_, std::string nameSpace_)
-    : broker(broker_), context(context_), nameSpace(std::move(nameSpace_)), instance(nullptr), enumeration(nullptr),
+    : broker(broker_),
+      context(context_),
+      nameSpace(std::move(nameSpace_)),
+      instance(nullptr),
+      enumeration(nullptr),
       initialLoad(false) {
     const std::string params = parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
     NX_ENTER_PARAMS(loggerCMPIIPLanEndPoint, params.c_str());

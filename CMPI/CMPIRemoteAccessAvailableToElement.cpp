@@ -8,7 +8,8 @@ static const std::string loggerCMPIRemoteAccessAvailableToElement = "Tarvo.IPInt
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_IPRemoteAccessAvailableToElement", IPRemoteAccessAvailableToElementId,
+    "KVRNX_IPRemoteAccessAvailableToElement",
+    IPRemoteAccessAvailableToElementId,
     {IPRemoteServiceAccessPointId, "KVRNX_IPRemoteServiceAccessPoint", "CIM_RemoteServiceAccessPoint", "Antecedent"},
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "Dependent"},
     false,
@@ -16,7 +17,9 @@ const AssociationClass kAssociation = {
 
 }  // namespace
 
-CMPIRemoteAccessAvailableToElement::CMPIRemoteAccessAvailableToElement(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIRemoteAccessAvailableToElement::CMPIRemoteAccessAvailableToElement(const CMPIBroker* broker_,
+                                                                       const CMPIContext* context_,
+                                                                       const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIRemoteAccessAvailableToElement, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIRemoteAccessAvailableToElement, params.c_str());
@@ -37,11 +40,14 @@ CMPIRemoteAccessAvailableToElement::CMPIRemoteAccessAvailableToElement(const CMP
 }
 
 CMPIObjectPath* CMPIRemoteAccessAvailableToElement::locateRemoteSAP(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPRemoteServiceAccessPoint", &RemoteAccessAvailableToElement::getRemoteServiceAccessPointMoniker, "getRemoteServiceAccessPointMoniker");
+    return locate(path, "KVRNX_IPRemoteServiceAccessPoint",
+                  &RemoteAccessAvailableToElement::getRemoteServiceAccessPointMoniker,
+                  "getRemoteServiceAccessPointMoniker");
 }
 
 CMPIObjectPath* CMPIRemoteAccessAvailableToElement::locateIPEndptPath(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPProtocolEndpoint", &RemoteAccessAvailableToElement::getIPProtocolEndpointMoniker, "getIPProtocolEndpointMoniker");
+    return locate(path, "KVRNX_IPProtocolEndpoint", &RemoteAccessAvailableToElement::getIPProtocolEndpointMoniker,
+                  "getIPProtocolEndpointMoniker");
 }
 
 void CMPIRemoteAccessAvailableToElement::setAssociationProperties(CMPIInstance* instance) {

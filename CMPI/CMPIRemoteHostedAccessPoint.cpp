@@ -8,7 +8,8 @@ static const std::string loggerCMPIRemoteHostedAccessPoint = "Tarvo.IPInterfaceP
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_RemoteHostedAccessPoint", RemoteHostedAccessPointId,
+    "KVRNX_RemoteHostedAccessPoint",
+    RemoteHostedAccessPointId,
     {ComputerSystemId, "KVRNX_ComputerSystem", "CIM_ComputerSystem", "Antecedent"},
     {IPRemoteServiceAccessPointId, "KVRNX_IPRemoteServiceAccessPoint", "CIM_RemoteServiceAccessPoint", "Dependent"},
     false,
@@ -16,7 +17,8 @@ const AssociationClass kAssociation = {
 
 }  // namespace
 
-CMPIRemoteHostedAccessPoint::CMPIRemoteHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIRemoteHostedAccessPoint::CMPIRemoteHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_,
+                                                         const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIRemoteHostedAccessPoint, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIRemoteHostedAccessPoint, params.c_str());
@@ -37,7 +39,8 @@ CMPIRemoteHostedAccessPoint::CMPIRemoteHostedAccessPoint(const CMPIBroker* broke
 }
 
 bool CMPIRemoteHostedAccessPoint::setObjectPath(const CMPIObjectPath* path) {
-    return setAnchoredObjectPath<Side::A>(path, "Name", &CMPIRemoteHostedAccessPoint::locateRemoteSAP, &CMPIRemoteHostedAccessPoint::locateComputer);
+    return setAnchoredObjectPath<Side::A>(path, "Name", &CMPIRemoteHostedAccessPoint::locateRemoteSAP,
+                                          &CMPIRemoteHostedAccessPoint::locateComputer);
 }
 
 CMPIObjectPath* CMPIRemoteHostedAccessPoint::locateComputer(const CMPIObjectPath* path) {
@@ -45,7 +48,8 @@ CMPIObjectPath* CMPIRemoteHostedAccessPoint::locateComputer(const CMPIObjectPath
 }
 
 CMPIObjectPath* CMPIRemoteHostedAccessPoint::locateRemoteSAP(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPRemoteServiceAccessPoint", &RemoteHostedAccessPoint::getRemoteSAPMoniker, "getRemoteSAPMoniker");
+    return locate(path, "KVRNX_IPRemoteServiceAccessPoint", &RemoteHostedAccessPoint::getRemoteSAPMoniker,
+                  "getRemoteSAPMoniker");
 }
 
 }  // namespace IPInterfaceProvider

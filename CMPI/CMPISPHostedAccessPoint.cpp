@@ -8,7 +8,8 @@ static const std::string loggerCMPISPHostedAccessPoint = "Tarvo.IPInterfaceProvi
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_SPHostedAccessPoint", SPHostedAccessPointId,
+    "KVRNX_SPHostedAccessPoint",
+    SPHostedAccessPointId,
     {SPComputerSystemId, "KVRNX_SPComputerSystem", "CIM_ComputerSystem", "Antecedent"},
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "Dependent"},
     false,
@@ -16,7 +17,8 @@ const AssociationClass kAssociation = {
 
 }  // namespace
 
-CMPISPHostedAccessPoint::CMPISPHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPISPHostedAccessPoint::CMPISPHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_,
+                                                 const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPISPHostedAccessPoint, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPISPHostedAccessPoint, params.c_str());
@@ -49,7 +51,8 @@ CMPIObjectPath* CMPISPHostedAccessPoint::locateBMC(const CMPIObjectPath* path) {
 }
 
 CMPIObjectPath* CMPISPHostedAccessPoint::locateProtocolEndpoint(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPProtocolEndpoint", &SPHostedAccessPoint::getIPProtocolEndPointMoniker, "getIPProtocolEndPointMoniker");
+    return locate(path, "KVRNX_IPProtocolEndpoint", &SPHostedAccessPoint::getIPProtocolEndPointMoniker,
+                  "getIPProtocolEndPointMoniker");
 }
 
 }  // namespace IPInterfaceProvider

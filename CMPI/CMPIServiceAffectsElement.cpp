@@ -8,7 +8,8 @@ static const std::string loggerCMPIServiceAffectsElement = "Tarvo.IPInterfacePro
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_IPServiceAffectsElement", IPServiceAffectsElementId,
+    "KVRNX_IPServiceAffectsElement",
+    IPServiceAffectsElementId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "AffectedElement"},
     {IPConfigurationServiceId, "KVRNX_IPConfigurationService", "CIM_IPConfigurationService", "AffectingElement"},
     false,
@@ -16,7 +17,8 @@ const AssociationClass kAssociation = {
 
 }  // namespace
 
-CMPIServiceAffectsElement::CMPIServiceAffectsElement(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIServiceAffectsElement::CMPIServiceAffectsElement(const CMPIBroker* broker_, const CMPIContext* context_,
+                                                     const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIServiceAffectsElement, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIServiceAffectsElement, params.c_str());
@@ -37,15 +39,18 @@ CMPIServiceAffectsElement::CMPIServiceAffectsElement(const CMPIBroker* broker_, 
 }
 
 bool CMPIServiceAffectsElement::setObjectPath(const CMPIObjectPath* path) {
-    return setAnchoredObjectPath<Side::B>(path, "SystemName", &CMPIServiceAffectsElement::locateIPEndptPath, &CMPIServiceAffectsElement::locateIPConfgSvce);
+    return setAnchoredObjectPath<Side::B>(path, "SystemName", &CMPIServiceAffectsElement::locateIPEndptPath,
+                                          &CMPIServiceAffectsElement::locateIPConfgSvce);
 }
 
 CMPIObjectPath* CMPIServiceAffectsElement::locateIPEndptPath(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPProtocolEndpoint", &ServiceAffectsElement::getIPProtocolEndpointMoniker, "getIPProtocolEndpointMoniker");
+    return locate(path, "KVRNX_IPProtocolEndpoint", &ServiceAffectsElement::getIPProtocolEndpointMoniker,
+                  "getIPProtocolEndpointMoniker");
 }
 
 CMPIObjectPath* CMPIServiceAffectsElement::locateIPConfgSvce(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPConfigurationService", &ServiceAffectsElement::getIPConfigurationServiceMoniker, "getIPConfigurationServiceMoniker");
+    return locate(path, "KVRNX_IPConfigurationService", &ServiceAffectsElement::getIPConfigurationServiceMoniker,
+                  "getIPConfigurationServiceMoniker");
 }
 
 }  // namespace IPInterfaceProvider

@@ -8,15 +8,18 @@ static const std::string loggerCMPIStaticElementSettingData = "Tarvo.IPInterface
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_StaticIPElementSettingData", StaticIPElementSettingDataId,
+    "KVRNX_StaticIPElementSettingData",
+    StaticIPElementSettingDataId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "ManagedElement"},
-    {StaticIPAssignmentSettingDataId, "KVRNX_StaticIPAssignmentSettingData", "CIM_StaticIPAssignmentSettingData", "SettingData"},
+    {StaticIPAssignmentSettingDataId, "KVRNX_StaticIPAssignmentSettingData", "CIM_StaticIPAssignmentSettingData",
+     "SettingData"},
     true,
 };
 
 }  // namespace
 
-CMPIStaticElementSettingData::CMPIStaticElementSettingData(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIStaticElementSettingData::CMPIStaticElementSettingData(const CMPIBroker* broker_, const CMPIContext* context_,
+                                                           const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIStaticElementSettingData, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIStaticElementSettingData, params.c_str());
@@ -37,11 +40,13 @@ CMPIStaticElementSettingData::CMPIStaticElementSettingData(const CMPIBroker* bro
 }
 
 CMPIObjectPath* CMPIStaticElementSettingData::locateIPEndptPath(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPProtocolEndpoint", &StaticIPElementSettingData::getManagedElementMoniker, "getManagedElementMoniker");
+    return locate(path, "KVRNX_IPProtocolEndpoint", &StaticIPElementSettingData::getManagedElementMoniker,
+                  "getManagedElementMoniker");
 }
 
 CMPIObjectPath* CMPIStaticElementSettingData::locateStaticSettingDataPath(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_StaticIPAssignmentSettingData", &StaticIPElementSettingData::getStaticIPSettingDataMoniker, "getStaticIPSettingDataMoniker");
+    return locate(path, "KVRNX_StaticIPAssignmentSettingData",
+                  &StaticIPElementSettingData::getStaticIPSettingDataMoniker, "getStaticIPSettingDataMoniker");
 }
 
 void CMPIStaticElementSettingData::setAssociationProperties(CMPIInstance* instance) {

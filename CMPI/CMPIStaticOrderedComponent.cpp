@@ -8,15 +8,18 @@ static const std::string loggerCMPIStaticOrderedComponent = "Tarvo.IPInterfacePr
 namespace {
 
 const AssociationClass kAssociation = {
-    "KVRNX_StaticOrderedComponent", StaticOrderedComponentId,
+    "KVRNX_StaticOrderedComponent",
+    StaticOrderedComponentId,
     {IPAssignmentSettingDataId, "KVRNX_IPAssignmentSettingData", "CIM_IPAssignmentSettingData", "GroupComponent"},
-    {StaticIPAssignmentSettingDataId, "KVRNX_StaticIPAssignmentSettingData", "CIM_StaticIPAssignmentSettingData", "PartComponent"},
+    {StaticIPAssignmentSettingDataId, "KVRNX_StaticIPAssignmentSettingData", "CIM_StaticIPAssignmentSettingData",
+     "PartComponent"},
     true,
 };
 
 }  // namespace
 
-CMPIStaticOrderedComponent::CMPIStaticOrderedComponent(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path)
+CMPIStaticOrderedComponent::CMPIStaticOrderedComponent(const CMPIBroker* broker_, const CMPIContext* context_,
+                                                       const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIStaticOrderedComponent, NX_FILE) {
     const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIStaticOrderedComponent, params.c_str());
@@ -37,15 +40,19 @@ CMPIStaticOrderedComponent::CMPIStaticOrderedComponent(const CMPIBroker* broker_
 }
 
 bool CMPIStaticOrderedComponent::setObjectPath(const CMPIObjectPath* path) {
-    return setAnchoredObjectPath<Side::A>(path, "InstanceID", &CMPIStaticOrderedComponent::locateStaticAssignmentSetting, &CMPIStaticOrderedComponent::locateAssignmentSetting);
+    return setAnchoredObjectPath<Side::A>(path, "InstanceID",
+                                          &CMPIStaticOrderedComponent::locateStaticAssignmentSetting,
+                                          &CMPIStaticOrderedComponent::locateAssignmentSetting);
 }
 
 CMPIObjectPath* CMPIStaticOrderedComponent::locateAssignmentSetting(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_IPAssignmentSettingData", &StaticOrderedComponent::getGroupComponentMoniker, "getGroupComponentMoniker");
+    return locate(path, "KVRNX_IPAssignmentSettingData", &StaticOrderedComponent::getGroupComponentMoniker,
+                  "getGroupComponentMoniker");
 }
 
 CMPIObjectPath* CMPIStaticOrderedComponent::locateStaticAssignmentSetting(const CMPIObjectPath* path) {
-    return locate(path, "KVRNX_StaticIPAssignmentSettingData", &StaticOrderedComponent::getPartComponentMoniker, "getPartComponentMoniker");
+    return locate(path, "KVRNX_StaticIPAssignmentSettingData", &StaticOrderedComponent::getPartComponentMoniker,
+                  "getPartComponentMoniker");
 }
 
 void CMPIStaticOrderedComponent::setAssociationProperties(CMPIInstance* instance) {

@@ -14,8 +14,7 @@ IPElementCapabilities::~IPElementCapabilities() = default;
 
 Nx::Moniker IPElementCapabilities::getIPMoniker(Nx::Moniker& capabilities) {
     NX_ENTER(loggerIPElementCapabilities);
-    const std::string name =
-        requireKey(capabilities, "InstanceID", "Could not find 'InstanceID' Key in Moniker");
+    const std::string name = requireKey(capabilities, "InstanceID", "Could not find 'InstanceID' Key in Moniker");
     IPprotocolEndpoint endpoint;
     if (!findEndpoint(endpoint, name, nullptr))
         throw Nx::FrameworkException("Could not get 'System Name' and  'Name' key");

@@ -18,7 +18,8 @@ IPElementSettingData::~IPElementSettingData() = default;
 Nx::Moniker IPElementSettingData::getManagedElementMoniker(Nx::Moniker& setting) {
     NX_ENTER(loggerIPElementSettingData);
     std::string instanceId;
-    if (!findKey(setting, "InstanceID", instanceId)) throw Nx::FrameworkException("Could not find 'Name' key in Moniker");
+    if (!findKey(setting, "InstanceID", instanceId))
+        throw Nx::FrameworkException("Could not find 'Name' key in Moniker");
     std::vector<std::string> tokens;
     Tokenize(instanceId, tokens, "%");
     if (tokens.size() < 2) throw Nx::FrameworkException("Instance ID Property value is not correct");

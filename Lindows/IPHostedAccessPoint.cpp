@@ -22,13 +22,14 @@ Nx::Moniker IPHostedAccessPoint::getIPProtocolEndPointMoniker(Nx::Moniker& compu
     findKey(computer, "CreationClassName", creationClass);
     // The service processor is a computer system too; its endpoints name it "BMC:-1".
     if (creationClass == SPComputerSystemClass) {
-        if (name != ServiceProcessorName) throw Nx::FrameworkException("'SystemCreationClasName'  is not BMC in Moniker");
+        if (name != ServiceProcessorName)
+            throw Nx::FrameworkException("'SystemCreationClasName'  is not BMC in Moniker");
     } else {
         requireHostComputer(name);
     }
     Nx::Moniker result;
-    result.addKey("SystemCreationClassName", creationClass == SPComputerSystemClass ? SPComputerSystemClass
-                                                                                     : ComputerSystemClass);
+    result.addKey("SystemCreationClassName",
+                  creationClass == SPComputerSystemClass ? SPComputerSystemClass : ComputerSystemClass);
     result.addKey("CreationClassName", IPProtocolEndpointClass);
     result.addKey("SystemName", name);
     NX_EXIT(loggerIPHostedAccessPoint);

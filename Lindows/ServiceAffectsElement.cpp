@@ -30,8 +30,7 @@ Nx::Moniker ServiceAffectsElement::getIPProtocolEndpointMoniker(Nx::Moniker& ser
 
 Nx::Moniker ServiceAffectsElement::getIPConfigurationServiceMoniker(Nx::Moniker& endpoint) {
     NX_ENTER(loggerServiceAffectsElement);
-    const std::string systemName =
-        requireKey(endpoint, "SystemName", "Could not find 'System Name' Key in Moniker");
+    const std::string systemName = requireKey(endpoint, "SystemName", "Could not find 'System Name' Key in Moniker");
     std::string systemClass;
     findKey(endpoint, "SystemCreationClassName", systemClass);
     NX_VAR(loggerServiceAffectsElement, "SystemCreationClassName", systemClass.c_str());

@@ -20,7 +20,8 @@ StaticIPElementSettingData::~StaticIPElementSettingData() = default;
 Nx::Moniker StaticIPElementSettingData::getManagedElementMoniker(Nx::Moniker& setting) {
     NX_ENTER(loggerStaticIPElementSettingData);
     std::string instanceId;
-    if (!findKey(setting, "InstanceID", instanceId)) throw Nx::FrameworkException("Could not find 'Name' key in Moniker");
+    if (!findKey(setting, "InstanceID", instanceId))
+        throw Nx::FrameworkException("Could not find 'Name' key in Moniker");
     std::vector<std::string> instance_tokens;
     Tokenize(instanceId, instance_tokens, "%");
     if (instance_tokens.size() < 2) throw Nx::FrameworkException("Could not find 'InstanceID tokens");

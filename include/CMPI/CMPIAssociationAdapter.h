@@ -106,8 +106,8 @@ public:
         enter(__func__, __LINE__, params);
         bool notTarget = true;
         if (const AssociationEnd* far = farEnd())
-            notTarget = ::strcasecmp(resultClass, far->className) != 0 &&
-                        ::strcasecmp(resultClass, far->parentClassName) != 0;
+            notTarget =
+                ::strcasecmp(resultClass, far->className) != 0 && ::strcasecmp(resultClass, far->parentClassName) != 0;
         leave(__func__, __LINE__, params);
         return notTarget;
     }
@@ -168,9 +168,16 @@ public:
 protected:
     CMPIAssociationAdapter(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path,
                            const AssociationClass& association_, const std::string& logger_, const char* file_)
-        : broker(broker_), context(context_), nameSpace(ProviderUtilities::getNamespace(path)), model(),
-          requestedClassId(ProviderUtilities::getClassId(path)), endA(broker_, context_, nameSpace),
-          endB(broker_, context_, nameSpace), association(association_), logger(logger_), file(file_) {
+        : broker(broker_),
+          context(context_),
+          nameSpace(ProviderUtilities::getNamespace(path)),
+          model(),
+          requestedClassId(ProviderUtilities::getClassId(path)),
+          endA(broker_, context_, nameSpace),
+          endB(broker_, context_, nameSpace),
+          association(association_),
+          logger(logger_),
+          file(file_) {
         logRecord(logger, "CMPIAssociationAdapter", file, __LINE__, 4000,
                   trace("requestedClassId", file, __LINE__, static_cast<unsigned>(requestedClassId)));
     }

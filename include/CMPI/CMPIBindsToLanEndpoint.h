@@ -9,8 +9,10 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIBindsToLanEndpoint : public CMPIAssociationAdapter<CMPIBindsToLanEndpoint, BindsToLANEndpoint, CMPIProtocolEndpoint, CMPIIPLanEndPoint> {
-    using Base = CMPIAssociationAdapter<CMPIBindsToLanEndpoint, BindsToLANEndpoint, CMPIProtocolEndpoint, CMPIIPLanEndPoint>;
+class CMPIBindsToLanEndpoint : public CMPIAssociationAdapter<CMPIBindsToLanEndpoint, BindsToLANEndpoint,
+                                                             CMPIProtocolEndpoint, CMPIIPLanEndPoint> {
+    using Base =
+        CMPIAssociationAdapter<CMPIBindsToLanEndpoint, BindsToLANEndpoint, CMPIProtocolEndpoint, CMPIIPLanEndPoint>;
     friend Base;
 
 public:

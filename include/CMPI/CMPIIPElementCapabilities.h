@@ -9,8 +9,11 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIIPElementCapabilities : public CMPIAssociationAdapter<CMPIIPElementCapabilities, IPElementCapabilities, CMPIProtocolEndpoint, CMPIIPEnabledLogicalElementCapabilities> {
-    using Base = CMPIAssociationAdapter<CMPIIPElementCapabilities, IPElementCapabilities, CMPIProtocolEndpoint, CMPIIPEnabledLogicalElementCapabilities>;
+class CMPIIPElementCapabilities
+    : public CMPIAssociationAdapter<CMPIIPElementCapabilities, IPElementCapabilities, CMPIProtocolEndpoint,
+                                    CMPIIPEnabledLogicalElementCapabilities> {
+    using Base = CMPIAssociationAdapter<CMPIIPElementCapabilities, IPElementCapabilities, CMPIProtocolEndpoint,
+                                        CMPIIPEnabledLogicalElementCapabilities>;
     friend Base;
 
 public:

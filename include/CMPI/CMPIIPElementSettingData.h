@@ -9,8 +9,10 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIIPElementSettingData : public CMPIAssociationAdapter<CMPIIPElementSettingData, IPElementSettingData, CMPIProtocolEndpoint, CMPIAssignmentSettingData> {
-    using Base = CMPIAssociationAdapter<CMPIIPElementSettingData, IPElementSettingData, CMPIProtocolEndpoint, CMPIAssignmentSettingData>;
+class CMPIIPElementSettingData : public CMPIAssociationAdapter<CMPIIPElementSettingData, IPElementSettingData,
+                                                               CMPIProtocolEndpoint, CMPIAssignmentSettingData> {
+    using Base = CMPIAssociationAdapter<CMPIIPElementSettingData, IPElementSettingData, CMPIProtocolEndpoint,
+                                        CMPIAssignmentSettingData>;
     friend Base;
 
 public:

@@ -9,8 +9,10 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIIPHostedAccessPoint : public CMPIAssociationAdapter<CMPIIPHostedAccessPoint, IPHostedAccessPoint, CMPIIPComputerSystem, CMPIProtocolEndpoint> {
-    using Base = CMPIAssociationAdapter<CMPIIPHostedAccessPoint, IPHostedAccessPoint, CMPIIPComputerSystem, CMPIProtocolEndpoint>;
+class CMPIIPHostedAccessPoint : public CMPIAssociationAdapter<CMPIIPHostedAccessPoint, IPHostedAccessPoint,
+                                                              CMPIIPComputerSystem, CMPIProtocolEndpoint> {
+    using Base = CMPIAssociationAdapter<CMPIIPHostedAccessPoint, IPHostedAccessPoint, CMPIIPComputerSystem,
+                                        CMPIProtocolEndpoint>;
     friend Base;
 
 public:

@@ -9,8 +9,10 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIIPHostedService : public CMPIAssociationAdapter<CMPIIPHostedService, IPHostedService, CMPIIPComputerSystem, CMPIIPConfigurationService> {
-    using Base = CMPIAssociationAdapter<CMPIIPHostedService, IPHostedService, CMPIIPComputerSystem, CMPIIPConfigurationService>;
+class CMPIIPHostedService : public CMPIAssociationAdapter<CMPIIPHostedService, IPHostedService, CMPIIPComputerSystem,
+                                                          CMPIIPConfigurationService> {
+    using Base =
+        CMPIAssociationAdapter<CMPIIPHostedService, IPHostedService, CMPIIPComputerSystem, CMPIIPConfigurationService>;
     friend Base;
 
 public:

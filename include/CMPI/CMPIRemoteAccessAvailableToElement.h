@@ -9,12 +9,16 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIRemoteAccessAvailableToElement : public CMPIAssociationAdapter<CMPIRemoteAccessAvailableToElement, RemoteAccessAvailableToElement, CMPIRemoteServiceAccessPoint, CMPIProtocolEndpoint> {
-    using Base = CMPIAssociationAdapter<CMPIRemoteAccessAvailableToElement, RemoteAccessAvailableToElement, CMPIRemoteServiceAccessPoint, CMPIProtocolEndpoint>;
+class CMPIRemoteAccessAvailableToElement
+    : public CMPIAssociationAdapter<CMPIRemoteAccessAvailableToElement, RemoteAccessAvailableToElement,
+                                    CMPIRemoteServiceAccessPoint, CMPIProtocolEndpoint> {
+    using Base = CMPIAssociationAdapter<CMPIRemoteAccessAvailableToElement, RemoteAccessAvailableToElement,
+                                        CMPIRemoteServiceAccessPoint, CMPIProtocolEndpoint>;
     friend Base;
 
 public:
-    CMPIRemoteAccessAvailableToElement(const CMPIBroker* broker, const CMPIContext* context, const CMPIObjectPath* path);
+    CMPIRemoteAccessAvailableToElement(const CMPIBroker* broker, const CMPIContext* context,
+                                       const CMPIObjectPath* path);
 
 protected:
     CMPIObjectPath* locateRemoteSAP(const CMPIObjectPath* path);

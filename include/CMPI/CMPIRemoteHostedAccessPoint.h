@@ -9,8 +9,10 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIRemoteHostedAccessPoint : public CMPIAssociationAdapter<CMPIRemoteHostedAccessPoint, RemoteHostedAccessPoint, CMPIIPComputerSystem, CMPIRemoteServiceAccessPoint> {
-    using Base = CMPIAssociationAdapter<CMPIRemoteHostedAccessPoint, RemoteHostedAccessPoint, CMPIIPComputerSystem, CMPIRemoteServiceAccessPoint>;
+class CMPIRemoteHostedAccessPoint : public CMPIAssociationAdapter<CMPIRemoteHostedAccessPoint, RemoteHostedAccessPoint,
+                                                                  CMPIIPComputerSystem, CMPIRemoteServiceAccessPoint> {
+    using Base = CMPIAssociationAdapter<CMPIRemoteHostedAccessPoint, RemoteHostedAccessPoint, CMPIIPComputerSystem,
+                                        CMPIRemoteServiceAccessPoint>;
     friend Base;
 
 public:

@@ -9,8 +9,10 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPISPHostedAccessPoint : public CMPIAssociationAdapter<CMPISPHostedAccessPoint, SPHostedAccessPoint, CMPIIPComputerSystem, CMPIProtocolEndpoint> {
-    using Base = CMPIAssociationAdapter<CMPISPHostedAccessPoint, SPHostedAccessPoint, CMPIIPComputerSystem, CMPIProtocolEndpoint>;
+class CMPISPHostedAccessPoint : public CMPIAssociationAdapter<CMPISPHostedAccessPoint, SPHostedAccessPoint,
+                                                              CMPIIPComputerSystem, CMPIProtocolEndpoint> {
+    using Base = CMPIAssociationAdapter<CMPISPHostedAccessPoint, SPHostedAccessPoint, CMPIIPComputerSystem,
+                                        CMPIProtocolEndpoint>;
     friend Base;
 
 public:

@@ -9,8 +9,10 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIServiceAffectsElement : public CMPIAssociationAdapter<CMPIServiceAffectsElement, ServiceAffectsElement, CMPIProtocolEndpoint, CMPIIPConfigurationService> {
-    using Base = CMPIAssociationAdapter<CMPIServiceAffectsElement, ServiceAffectsElement, CMPIProtocolEndpoint, CMPIIPConfigurationService>;
+class CMPIServiceAffectsElement : public CMPIAssociationAdapter<CMPIServiceAffectsElement, ServiceAffectsElement,
+                                                                CMPIProtocolEndpoint, CMPIIPConfigurationService> {
+    using Base = CMPIAssociationAdapter<CMPIServiceAffectsElement, ServiceAffectsElement, CMPIProtocolEndpoint,
+                                        CMPIIPConfigurationService>;
     friend Base;
 
 public:

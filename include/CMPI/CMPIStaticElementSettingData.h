@@ -9,8 +9,11 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIStaticElementSettingData : public CMPIAssociationAdapter<CMPIStaticElementSettingData, StaticIPElementSettingData, CMPIProtocolEndpoint, CMPIStaticIPAssignmentSettingData> {
-    using Base = CMPIAssociationAdapter<CMPIStaticElementSettingData, StaticIPElementSettingData, CMPIProtocolEndpoint, CMPIStaticIPAssignmentSettingData>;
+class CMPIStaticElementSettingData
+    : public CMPIAssociationAdapter<CMPIStaticElementSettingData, StaticIPElementSettingData, CMPIProtocolEndpoint,
+                                    CMPIStaticIPAssignmentSettingData> {
+    using Base = CMPIAssociationAdapter<CMPIStaticElementSettingData, StaticIPElementSettingData, CMPIProtocolEndpoint,
+                                        CMPIStaticIPAssignmentSettingData>;
     friend Base;
 
 public:

@@ -9,8 +9,11 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIStaticOrderedComponent : public CMPIAssociationAdapter<CMPIStaticOrderedComponent, StaticOrderedComponent, CMPIAssignmentSettingData, CMPIStaticIPAssignmentSettingData> {
-    using Base = CMPIAssociationAdapter<CMPIStaticOrderedComponent, StaticOrderedComponent, CMPIAssignmentSettingData, CMPIStaticIPAssignmentSettingData>;
+class CMPIStaticOrderedComponent
+    : public CMPIAssociationAdapter<CMPIStaticOrderedComponent, StaticOrderedComponent, CMPIAssignmentSettingData,
+                                    CMPIStaticIPAssignmentSettingData> {
+    using Base = CMPIAssociationAdapter<CMPIStaticOrderedComponent, StaticOrderedComponent, CMPIAssignmentSettingData,
+                                        CMPIStaticIPAssignmentSettingData>;
     friend Base;
 
 public:

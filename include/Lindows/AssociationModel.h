@@ -17,9 +17,9 @@ namespace Nx {
 namespace IPInterfaceProvider {
 
 // The service processor's system name, as its endpoints name their system.
-extern const char* const ServiceProcessorName;  // "BMC:-1"
-extern const char* const ComputerSystemClass;   // "KVRNX_ComputerSystem"
-extern const char* const SPComputerSystemClass; // "KVRNX_SPComputerSystem"
+extern const char* const ServiceProcessorName;   // "BMC:-1"
+extern const char* const ComputerSystemClass;    // "KVRNX_ComputerSystem"
+extern const char* const SPComputerSystemClass;  // "KVRNX_SPComputerSystem"
 extern const char* const IPProtocolEndpointClass;
 
 // The value of the key named exactly name (case-sensitive); false when the moniker has none.

@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <climits>
 #include <map>
 #include <memory>
@@ -66,6 +67,23 @@ unsigned prefix(const std::vector<std::string>& list) {
     return list.empty() ? 0 : std::stoul(list[0].substr(list[0].find('/') + 1));
 }
 
+// AddressOrigin: the file's BOOTPROTO first (dhcp 4, static/none 3), else the kernel's lifetime
+// of the primary address (IPv4, else IPv6).
+unsigned origin(const std::string& name, const IpView& view) {
+    if (kIfcfg.count(name)) return assignments(kIfcfg.at(name))["BOOTPROTO"] == "dhcp" ? 4 : 3;
+    if (view.ipv4.empty() && view.ipv6.empty()) return 0;
+    return (view.ipv4.empty() ? view.dynamic6 : view.dynamic4) ? 4 : 3;
+}
+
+std::set<std::string> keysOf(const ipif::Result& r) {
+    std::set<std::string> keys;
+    for (const ipif::ObjectPath& path : r.paths) {
+        const Value* key = path.keys.find("InstanceID") ? path.keys.find("InstanceID") : path.keys.find("Name");
+        keys.insert(key ? key->asString() : "<no key>");
+    }
+    return keys;
+}
+
 // The bridge and veths of the backend tests, plus an IPv6-only default route on wa and a dynamic
 // address with an IPv4-only default route on vb; wb belongs to the service processor.
 class LiveProvider : public LiveNamespace {
@@ -87,7 +105,7 @@ protected:
     void TearDown() override {
         // The provider's netlink sockets hold the namespace: it must go with the host.
         host_.reset();
-        EXPECT_EQ(run("grep -c libIPInterface /proc/" + std::to_string(::getpid()) + "/maps"), "0\n")
+        EXPECT_EQ(slurp("/proc/self/maps").find("libIPInterface"), std::string::npos)
             << "a provider library outlived its host";
         ::unsetenv("IPIF_HOST_MODEL");
         LiveNamespace::TearDown();
@@ -110,11 +128,12 @@ protected:
         return r.instances;
     }
 
-    // By the value of one property; a missing instance fails the test.
+    // The instances by the value of one property, which must be unique.
     std::map<std::string, Instance> byKey(const std::string& className, const char* key) {
         std::map<std::string, Instance> found;
         for (const Instance& instance : enumerate(className)) {
-            EXPECT_TRUE(found.emplace(str(instance, key), instance).second) << className << " twice: " << str(instance, key);
+            const std::string value = str(instance, key);
+            EXPECT_TRUE(found.emplace(value, instance).second) << className << ": " << value;
         }
         return found;
     }
@@ -146,12 +165,7 @@ TEST_F(LiveProvider, EndpointsCapabilitiesAndServiceAgreeWithIp) {
         EXPECT_EQ(num(e, "ProtocolIFType"), families ? 4095 + families : 0);
         EXPECT_EQ(num(e, "EnabledState"), expected.up ? 2u : 3u);
         EXPECT_EQ(num(e, "RequestedState"), expected.up ? 2u : 3u);
-        // The file's BOOTPROTO first (dhcp 4, static/none 3), else the kernel's lifetime of the
-        // primary address.
-        unsigned origin = expected.ipv4.empty() && expected.ipv6.empty() ? 0
-                          : (expected.ipv4.empty() ? expected.dynamic6 : expected.dynamic4) ? 4 : 3;
-        if (kIfcfg.count(name)) origin = assignments(kIfcfg.at(name))["BOOTPROTO"] == "dhcp" ? 4 : 3;
-        EXPECT_EQ(num(e, "AddressOrigin"), origin);
+        EXPECT_EQ(num(e, "AddressOrigin"), origin(name, expected));
     }
     // The scenario itself, so that a broken ip parser cannot make the comparison vacuous.
     EXPECT_EQ(str(endpoints.at("va"), "IPv4Address"), "10.1.0.2");
@@ -160,7 +174,7 @@ TEST_F(LiveProvider, EndpointsCapabilitiesAndServiceAgreeWithIp) {
     EXPECT_EQ(num(endpoints.at("wa"), "IPVersionSupport"), 2u);
     EXPECT_EQ(num(endpoints.at("wb"), "EnabledState"), 3u);
 
-    const std::map<std::string, Instance> capabilities = byKey("KVRNX_IPEnabledLogicalElementCapabilities", "InstanceID");
+    const auto capabilities = byKey("KVRNX_IPEnabledLogicalElementCapabilities", "InstanceID");
     EXPECT_EQ(capabilities.size(), ip.size());
     for (const auto& [name, expected] : ip) {
         ASSERT_EQ(capabilities.count(name), 1u) << name;
@@ -215,9 +229,8 @@ TEST_F(LiveProvider, GatewaysAgreeWithIpRoute) {
     // then _IPv4; later ones without a gateway come as _IPv4 with nothing to access.
     std::vector<std::pair<std::string, IpView>> order;
     for (const auto& entry : askIp()) order.push_back(entry);
-    std::stable_sort(order.begin(), order.end(), [](const auto& a, const auto& b) {
-        return std::make_pair(kBmc.count(a.first), a.second.index) < std::make_pair(kBmc.count(b.first), b.second.index);
-    });
+    auto rank = [](const auto& entry) { return std::make_pair(kBmc.count(entry.first), entry.second.index); };
+    std::sort(order.begin(), order.end(), [&](const auto& a, const auto& b) { return rank(a) < rank(b); });
     std::vector<std::string> expected;
     for (const auto& [name, view] : order) {
         if (expected.empty() && view.gateway4.empty() && view.gateway6.empty()) continue;
@@ -255,9 +268,12 @@ TEST_F(LiveProvider, StaticSettingsReadAndRewriteTheIfcfgFiles) {
         const Instance& s = settings.at(id);
         // The file's keys when there is a file, else what the interface has now.
         std::map<std::string, std::string> file = {
-            {"IPV4ADDR", address(view.ipv4)},    {"NETMASK", view.ipv4.empty() ? "" : dottedMask(int(prefix(view.ipv4)))},
-            {"GATEWAY", view.gateway4},          {"IPV6ADDR", address(view.ipv6)},
-            {"PREFIX", std::to_string(prefix(view.ipv6))}, {"IPV6GATEWAY", view.gateway6}};
+            {"IPV4ADDR", address(view.ipv4)},
+            {"NETMASK", view.ipv4.empty() ? "" : dottedMask(int(prefix(view.ipv4)))},
+            {"GATEWAY", view.gateway4},
+            {"IPV6ADDR", address(view.ipv6)},
+            {"PREFIX", std::to_string(prefix(view.ipv6))},
+            {"IPV6GATEWAY", view.gateway6}};
         if (kIfcfg.count(name)) file = assignments(kIfcfg.at(name));
         EXPECT_EQ(str(s, "ElementName"), name);
         EXPECT_EQ(num(s, "AddressOrigin"), 3u);
@@ -279,9 +295,10 @@ TEST_F(LiveProvider, StaticSettingsReadAndRewriteTheIfcfgFiles) {
     ipif::Result r = host().modifyInstance(change.path, change);
     ASSERT_TRUE(r.ok()) << r.rcName() << " " << r.message;
     std::string rewritten = kIfcfg.at("va");
-    for (const auto& [from, to] : {std::pair<std::string, std::string>{"NETMASK=255.255.255.0", "NETMASK=255.255.0.0"},
-                                   {"PREFIX=64", "PREFIX=56"}, {"CONFIG_NAME=uplink", "CONFIG_NAME=edited"}}) {
-        rewritten.replace(rewritten.find(from), from.size(), to);
+    using Edit = std::pair<std::string, std::string>;
+    for (const Edit& edit : {Edit{"NETMASK=255.255.255.0", "NETMASK=255.255.0.0"}, Edit{"PREFIX=64", "PREFIX=56"},
+                             Edit{"CONFIG_NAME=uplink", "CONFIG_NAME=edited"}}) {
+        rewritten.replace(rewritten.find(edit.first), edit.first.size(), edit.second);
     }
     EXPECT_EQ(slurp(ifcfg("va")), rewritten);
     r = host().getInstance(change.path);
@@ -297,6 +314,41 @@ TEST_F(LiveProvider, StaticSettingsReadAndRewriteTheIfcfgFiles) {
     hostile.properties.set("GatewayIPv4Address", Value::string("10.1.0.1;reboot"));
     EXPECT_EQ(host().modifyInstance(hostile.path, hostile).rc, 4);
     EXPECT_EQ(slurp(ifcfg("va")), rewritten);
+}
+
+TEST_F(LiveProvider, AssociationsReachTheLiveFarEnds) {
+    const std::map<std::string, IpView> ip = askIp();
+    const std::map<std::string, Instance> endpoints = byKey("KVRNX_IPProtocolEndpoint", "Name");
+    // The far ends are the gateway instances that an enumeration presents for the interface
+    // (GatewaysAgreeWithIpRoute holds those against ip route).
+    std::map<std::string, std::set<std::string>> gateways;
+    for (const Instance& g : enumerate("KVRNX_IPRemoteServiceAccessPoint")) {
+        gateways[str(g, "ElementName")].insert(str(g, "Name"));
+    }
+    ASSERT_EQ(gateways["va"], (std::set<std::string>{"va_IPv4", "va_IPv6"}));
+    std::set<std::string> hosted;
+    for (const auto& [name, view] : ip) {
+        SCOPED_TRACE(name);
+        ASSERT_EQ(endpoints.count(name), 1u);
+        const ipif::ObjectPath& endpoint = endpoints.at(name).path;
+        const std::string id = (kBmc.count(name) ? "BMC%" : "Computer%") + name;
+        if (!kBmc.count(name)) hosted.insert(name);
+        EXPECT_EQ(keysOf(host().associatorNames(endpoint, "KVRNX_StaticIPElementSettingData")),
+                  std::set<std::string>{id});
+        EXPECT_EQ(keysOf(host().associatorNames(endpoint, "KVRNX_IPRemoteAccessAvailableToElement")), gateways[name]);
+        // The setting in force follows the origin, so the ifcfg files and the kernel decide it.
+        for (const char* kind : {"static", "dhcp"}) {
+            const ipif::Result r = host().references(
+                host().parsePath("KVRNX_IPAssignmentSettingData.InstanceID=\"" + id + "%" + kind + "\""),
+                "KVRNX_IPElementSettingData");
+            ASSERT_EQ(r.instances.size(), 1u) << kind << ": " << r.rcName() << " " << r.message;
+            const bool current = origin(name, view) == (kind[0] == 'd' ? 4u : 3u);
+            EXPECT_EQ(num(r.instances[0], "IsCurrent"), current ? 1u : 2u) << kind;
+        }
+    }
+    const ipif::ObjectPath computer = host().parsePath(
+        "KVRNX_ComputerSystem.CreationClassName=\"KVRNX_ComputerSystem\",Name=\"" + hostName() + "\"");
+    EXPECT_EQ(keysOf(host().associatorNames(computer, "KVRNX_IPHostedAccessPoint")), hosted);
 }
 
 TEST_F(LiveProvider, IpifPrintsTheNamespacesInterfaces) {

@@ -237,7 +237,8 @@ TEST_F(ApplyMethod, NetworkManagerRefusesBeforeAnythingIsWritten) {
         return true;
     });
     const CMPIBroker* broker = host().broker();
-    CMPIObjectPath* configuration = CMNewObjectPath(broker, "root/cimv2", "KVRNX_StaticIPAssignmentSettingData", nullptr);
+    CMPIObjectPath* configuration =
+        CMNewObjectPath(broker, "root/cimv2", "KVRNX_StaticIPAssignmentSettingData", nullptr);
     CMAddKey(configuration, "InstanceID", "Computer%eth0%static", CMPI_chars);
     CMPIObjectPath* endpoint = CMNewObjectPath(broker, "root/cimv2", "KVRNX_IPProtocolEndpoint", nullptr);
     CMAddKey(endpoint, "Name", "eth0", CMPI_chars);
@@ -260,7 +261,8 @@ TEST_F(ApplyMethod, NetworkManagerRefusesBeforeAnythingIsWritten) {
     Nx::HostModel::setCurrent(nullptr);
     EXPECT_EQ(status.rc, CMPI_RC_ERR_FAILED);
     ASSERT_TRUE(status.msg);
-    EXPECT_STREQ(CMGetCharPtr(status.msg), "Configuration Cannot be Applied since NetworkManager Tool is present in Endpoint");
+    EXPECT_STREQ(CMGetCharPtr(status.msg),
+                 "Configuration Cannot be Applied since NetworkManager Tool is present in Endpoint");
     EXPECT_EQ(CMGetArgCount(out, nullptr), 0u);
     EXPECT_EQ(run, std::vector<std::string>{kRpm});
     EXPECT_EQ(node("/host/eth0/ip", 25).text, "192.168.1.10");
@@ -274,10 +276,10 @@ TEST_F(ApplyMethod, IpifShowsTheReturnValueAndTheJob) {
         for (char c : text) out += c == '\'' ? std::string("'\\''") : std::string(1, c);
         return out + "'";
     };
+    const std::string configuration = "KVRNX_StaticIPAssignmentSettingData.InstanceID=\"Computer%eth0%static\"";
     const std::string command = std::string(IPIF_BINARY_DIR) + "/cli/ipif cm " + quoted(servicePath()) + " " +
-                                kMethod + " " +
-                                quoted("Configuration=KVRNX_StaticIPAssignmentSettingData.InstanceID=\"Computer%eth0%static\"") +
-                                " " + quoted("Endpoint=" + endpointPath("eth0")) + " 2>&1";
+                                kMethod + " " + quoted("Configuration=" + configuration) + " " +
+                                quoted("Endpoint=" + endpointPath("eth0")) + " 2>&1";
     std::string output;
     if (FILE* pipe = ::popen(command.c_str(), "r")) {
         char buffer[512];

@@ -28,9 +28,7 @@ const std::string kSource = IPIF_SOURCE_DIR;
 
 class AssocTest : public ::testing::Test {
 protected:
-    AssocTest() {
-        std::filesystem::copy_file(std::string(IPIF_TEST_FIXTURES) + "/host-basic.model", model);
-    }
+    AssocTest() { std::filesystem::copy_file(std::string(IPIF_TEST_FIXTURES) + "/host-basic.model", model); }
 
     // The host, built on first use. Without the companion, only this provider is registered.
     ipif::Host& host(bool companion = true) {
@@ -51,16 +49,20 @@ protected:
     }
 
     // The request path of a short form; a bare class name gives the keyless class path.
-    ipif::ObjectPath path(const std::string& spec) {
-        const auto colon = spec.find(':');
-        const std::string kind = spec.substr(0, colon), arg = colon == std::string::npos ? "" : spec.substr(colon + 1);
+    ipif::ObjectPath path(const std::string& form) {
+        const auto colon = form.find(':');
+        const std::string kind = form.substr(0, colon);
+        std::string arg = colon == std::string::npos ? "" : form.substr(colon + 1);
+        if (arg.size() > 4 && arg.compare(arg.size() - 4, 4, "/BMC") == 0) arg.resize(arg.size() - 4);
         const auto q = [](const std::string& v) { return ipif::quote(v); };
         std::string text;
         if (kind == "EP" || kind == "SAP" || kind == "LAN") {
-            const std::string cls = kind == "EP" ? "KVRNX_IPProtocolEndpoint"
-                                    : kind == "SAP" ? "KVRNX_IPRemoteServiceAccessPoint" : "KVRNX_LANEndpoint";
+            const std::string cls = kind == "EP"    ? "KVRNX_IPProtocolEndpoint"
+                                    : kind == "SAP" ? "KVRNX_IPRemoteServiceAccessPoint"
+                                                    : "KVRNX_LANEndpoint";
             const std::string iface = arg.substr(0, arg.find('_'));
-            text = cls + ".SystemCreationClassName=" + q(kind == "LAN" ? "KVRNX_ComputerSystem" : systemClassOf(iface)) +
+            text = cls +
+                   ".SystemCreationClassName=" + q(kind == "LAN" ? "KVRNX_ComputerSystem" : systemClassOf(iface)) +
                    ",SystemName=" + q(systemOf(iface)) + ",CreationClassName=" + q(cls) + ",Name=" + q(arg);
         } else if (kind == "ASD" || kind == "ST" || kind == "CAPS") {
             text = std::string(kind == "ASD"  ? "KVRNX_IPAssignmentSettingData"
@@ -75,19 +77,22 @@ protected:
             text = "KVRNX_IPConfigurationService.SystemCreationClassName=\"KVRNX_ComputerSystem\",SystemName=" +
                    q(hostName) + ",CreationClassName=\"KVRNX_IPConfigurationService\",Name=\"IPConfigService\"";
         } else {
-            text = spec;
+            text = form;
         }
         return host().parsePath(text);
     }
 
     // The short form of a result path.
     std::string shortForm(const ipif::ObjectPath& p) const {
-        static const std::map<std::string, std::string> kinds = {
-            {"kvrnx_ipprotocolendpoint", "EP"},       {"kvrnx_ipassignmentsettingdata", "ASD"},
-            {"kvrnx_staticipassignmentsettingdata", "ST"}, {"kvrnx_ipremoteserviceaccesspoint", "SAP"},
-            {"kvrnx_ipenabledlogicalelementcapabilities", "CAPS"}, {"kvrnx_lanendpoint", "LAN"},
-            {"kvrnx_computersystem", "CS"},           {"kvrnx_spcomputersystem", "SP"},
-            {"kvrnx_ipconfigurationservice", "SVC"}};
+        static const std::map<std::string, std::string> kinds = {{"kvrnx_ipprotocolendpoint", "EP"},
+                                                                 {"kvrnx_ipassignmentsettingdata", "ASD"},
+                                                                 {"kvrnx_staticipassignmentsettingdata", "ST"},
+                                                                 {"kvrnx_ipremoteserviceaccesspoint", "SAP"},
+                                                                 {"kvrnx_ipenabledlogicalelementcapabilities", "CAPS"},
+                                                                 {"kvrnx_lanendpoint", "LAN"},
+                                                                 {"kvrnx_computersystem", "CS"},
+                                                                 {"kvrnx_spcomputersystem", "SP"},
+                                                                 {"kvrnx_ipconfigurationservice", "SVC"}};
         std::string cls;
         for (char c : p.className) cls += static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
         auto kind = kinds.find(cls);
