@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_BindsToLanEndPoint",
-    BindsToLanEndPointId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "Dependent"},
     {LANEndpointId, "KVRNX_LANEndpoint", "CIM_LanEndpoint", "Antecedent"},
     false,

@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_IPElementCapabilities",
-    IPElementCapabilitiesId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "ManagedElement"},
     {IPEnabledLogicalElementCapabilitiesId, "KVRNX_IPEnabledLogicalElementCapabilities",
      "CIM_EnabledLogicalElementCapabilities", "Capabilities"},

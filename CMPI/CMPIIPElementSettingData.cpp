@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_IPElementSettingData",
-    IPElementSettingDataId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "ManagedElement"},
     {IPAssignmentSettingDataId, "KVRNX_IPAssignmentSettingData", "CIM_IPAssignmentSettingData", "SettingData"},
     true,

@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_IPHostedAccessPoint",
-    IPHostedAccessPointId,
     {ComputerSystemId, "KVRNX_ComputerSystem", "CIM_ComputerSystem", "Antecedent"},
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "Dependent"},
     false,

@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_IPHostedService",
-    IPHostedServiceId,
     {ComputerSystemId, "KVRNX_ComputerSystem", "CIM_ComputerSystem", "Antecedent"},
     {IPConfigurationServiceId, "KVRNX_IPConfigurationService", "CIM_IPConfigurationService", "Dependent"},
     false,

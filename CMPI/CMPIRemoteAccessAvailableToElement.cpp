@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_IPRemoteAccessAvailableToElement",
-    IPRemoteAccessAvailableToElementId,
     {IPRemoteServiceAccessPointId, "KVRNX_IPRemoteServiceAccessPoint", "CIM_RemoteServiceAccessPoint", "Antecedent"},
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "Dependent"},
     false,

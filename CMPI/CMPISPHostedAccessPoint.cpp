@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_SPHostedAccessPoint",
-    SPHostedAccessPointId,
     {SPComputerSystemId, "KVRNX_SPComputerSystem", "CIM_ComputerSystem", "Antecedent"},
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "Dependent"},
     false,

@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_IPServiceAffectsElement",
-    IPServiceAffectsElementId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "AffectedElement"},
     {IPConfigurationServiceId, "KVRNX_IPConfigurationService", "CIM_IPConfigurationService", "AffectingElement"},
     false,

@@ -9,7 +9,6 @@ namespace {
 
 const AssociationClass kAssociation = {
     "KVRNX_StaticIPElementSettingData",
-    StaticIPElementSettingDataId,
     {IPProtocolEndpointId, "KVRNX_IPProtocolEndpoint", "CIM_IPProtocolEndpoint", "ManagedElement"},
     {StaticIPAssignmentSettingDataId, "KVRNX_StaticIPAssignmentSettingData", "CIM_StaticIPAssignmentSettingData",
      "SettingData"},

@@ -45,7 +45,6 @@ struct AssociationEnd {
 
 struct AssociationClass {
     const char* className;
-    unsigned short classId;
     AssociationEnd a;
     AssociationEnd b;
     bool bReferenceFirst;  // the object path carries b's reference before a's
@@ -55,7 +54,8 @@ enum class Side { None, A, B };
 
 // Positioning an end adapter on a path (a located one or the request's own). The assignment
 // setting adapter is positioned exactly; the computer system lookup takes the first system
-// enumerated; a LAN endpoint path with keys is fetched, a bare class path enumerated.
+// enumerated; a LAN endpoint path with keys is fetched, and a bare class path (which names no
+// endpoint to fetch) enumerated.
 inline void positionAt(CMPIAssignmentSettingData& end, const CMPIObjectPath* path) { end.setObjectPath(path, false); }
 inline void positionAt(CMPIIPComputerSystem& end, const CMPIObjectPath* path) { end.setObjectPath(path, false); }
 inline void positionAt(CMPIIPLanEndPoint& end, const CMPIObjectPath* path) {

@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
+#include <fstream>
 #include <memory>
 #include <mutex>
 
@@ -73,6 +74,22 @@ Mode commandMode(std::string& recordPath) {
     return Mode::Refuse;
 }
 
+// Under record mode, IPIF_COMMAND_ANSWERS may name a file of "COMMAND<TAB>OUTPUT" lines: a recorded
+// command listed there prints OUTPUT (one line), so a dry run can show how a request reacts to a host
+// where, say, NetworkManager is installed.
+void recordedAnswer(const std::string& command, std::string& output) {
+    const std::string answers = environment("IPIF_COMMAND_ANSWERS");
+    if (answers.empty()) return;
+    std::ifstream file(answers);
+    for (std::string line; std::getline(file, line);) {
+        const auto tab = line.find('\t');
+        if (tab == command.size() && line.compare(0, tab, command) == 0) {
+            output = line.substr(tab + 1) + "\n";
+            return;
+        }
+    }
+}
+
 PlatformUtilities::CommandRunner runner() {
     std::lock_guard<std::mutex> lock(runnerMutex);
     return installedRunner;
@@ -106,7 +123,9 @@ bool PlatformUtilities::runCommand(const std::string& command, std::string& outp
     std::string recordPath;
     switch (commandMode(recordPath)) {
         case Mode::Record:
-            return appendLine(recordPath, command);
+            if (!appendLine(recordPath, command)) return false;
+            recordedAnswer(command, output);
+            return true;
         case Mode::Refuse:
             logFailure("IPIF_COMMANDS is neither \"run\" nor \"record:PATH\"; not running: " + command);
             return false;

@@ -291,6 +291,19 @@ TEST_F(ApplyMethod, IpifShowsTheReturnValueAndTheJob) {
               "Job = \"root/cimv2:KVRNX_ConcreteJob.InstanceID=\\\"IPConfigSvcJob:1\\\"\";\n");
     EXPECT_EQ(commands(), std::vector<std::string>{kRpm});
     EXPECT_EQ(node("/host/eth0/ip", 25).text, "192.168.1.77");
+
+    // The same dry run on a host whose package list names NetworkManager is refused.
+    testfiles::writeFile(scratch.file("answers"), std::string(kRpm) + "\tNetworkManager-glib-0.7.0\n");
+    output.clear();
+    if (FILE* pipe = ::popen(("IPIF_COMMAND_ANSWERS=" + scratch.file("answers") + " " + command).c_str(), "r")) {
+        char buffer[512];
+        while (std::fgets(buffer, sizeof buffer, pipe)) output += buffer;
+        EXPECT_NE(::pclose(pipe), 0) << output;
+    }
+    EXPECT_EQ(output,
+              "ReturnValue = 4;\n"
+              "ipif: error: rc 1 (CMPI_RC_ERR_FAILED): Configuration Cannot be Applied since NetworkManager Tool "
+              "is present in Endpoint\n");
 }
 
 }  // namespace

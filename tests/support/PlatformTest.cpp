@@ -1,6 +1,8 @@
 #include "Nx/PlatformUtilities.h"
 #include "SupportTestUtil.h"
 
+#include <fstream>
+
 using namespace supporttest;
 using Nx::PlatformUtilities;
 
@@ -35,6 +37,14 @@ TEST(PlatformUtilities, CommandSeamRecordsRefusesOrDelegates) {
         EXPECT_TRUE(PlatformUtilities::runCommand("touch " + witness, output));
         EXPECT_TRUE(PlatformUtilities::requestReboot());
         EXPECT_EQ(slurp(record), "/etc/init.d/network restart \ntouch " + witness + "\nreboot\n");
+
+        // A dry run can be given the answers of another host; other commands still print nothing.
+        std::ofstream(dir.file("answers")) << "rpm -q\tnope\nrpm -qa | grep NetworkManager*\tNetworkManager-1.0\n";
+        ScopedEnv answers("IPIF_COMMAND_ANSWERS", dir.file("answers"));
+        EXPECT_TRUE(PlatformUtilities::runCommand("rpm -qa | grep NetworkManager*", output));
+        EXPECT_EQ(output, "NetworkManager-1.0\n");
+        EXPECT_TRUE(PlatformUtilities::runCommand("rpm -qa", output));
+        EXPECT_EQ(output, "");
     }
     {
         // A misspelt mode must neither run nor record anything.

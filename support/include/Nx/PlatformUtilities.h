@@ -17,7 +17,8 @@ public:
 
     // Runs a shell command as popen(command, "r") would. False when it could not be started;
     // otherwise output holds what it printed. Under IPIF_COMMANDS=record:PATH the command is only
-    // appended as one line to PATH and produces no output.
+    // appended as one line to PATH and prints nothing, or the line IPIF_COMMAND_ANSWERS gives it
+    // (a file of "COMMAND<TAB>OUTPUT" lines).
     static bool runCommand(const std::string& command, std::string& output);
 
     // IPIF_COMMANDS unset or "run" runs commands; any value other than "run" or "record:PATH"
