@@ -61,157 +61,56 @@ namespace {
 
 const char* orEmpty(const char* text) { return text ? text : ""; }
 
-// Builds the association adapter that serves classId over cop (the request's source object) and
-// hands it to use. False when classId is not an association.
+// Builds an adapter over cop for the request and hands it to use; it is destroyed on every path.
+template <class Adapter, class Use>
+bool serveWith(const CMPIContext* ctx, const CMPIObjectPath* cop, Use& use) {
+    Adapter adapter(broker, ctx, cop);
+    use(adapter);
+    return true;
+}
+
+// The association adapter of classId over cop (the request's source object). False when classId is
+// not an association.
 template <class Use>
 bool withAssociationAdapter(unsigned short classId, const CMPIContext* ctx, const CMPIObjectPath* cop, Use&& use) {
     switch (classId) {
-    case BindsToLanEndPointId: {
-        CMPIBindsToLanEndpoint adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPElementSettingDataId: {
-        CMPIIPElementSettingData adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case StaticOrderedComponentId: {
-        CMPIStaticOrderedComponent adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPHostedAccessPointId: {
-        CMPIIPHostedAccessPoint adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case StaticIPElementSettingDataId: {
-        CMPIStaticElementSettingData adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case RemoteHostedAccessPointId: {
-        CMPIRemoteHostedAccessPoint adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPRemoteAccessAvailableToElementId: {
-        CMPIRemoteAccessAvailableToElement adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case SPHostedAccessPointId: {
-        CMPISPHostedAccessPoint adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPElementCapabilitiesId: {
-        CMPIIPElementCapabilities adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPHostedServiceId: {
-        CMPIIPHostedService adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPServiceAffectsElementId: {
-        CMPIServiceAffectsElement adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    default:
-        return false;
+    case BindsToLanEndPointId: return serveWith<CMPIBindsToLanEndpoint>(ctx, cop, use);
+    case IPElementSettingDataId: return serveWith<CMPIIPElementSettingData>(ctx, cop, use);
+    case StaticOrderedComponentId: return serveWith<CMPIStaticOrderedComponent>(ctx, cop, use);
+    case IPHostedAccessPointId: return serveWith<CMPIIPHostedAccessPoint>(ctx, cop, use);
+    case StaticIPElementSettingDataId: return serveWith<CMPIStaticElementSettingData>(ctx, cop, use);
+    case RemoteHostedAccessPointId: return serveWith<CMPIRemoteHostedAccessPoint>(ctx, cop, use);
+    case IPRemoteAccessAvailableToElementId: return serveWith<CMPIRemoteAccessAvailableToElement>(ctx, cop, use);
+    case SPHostedAccessPointId: return serveWith<CMPISPHostedAccessPoint>(ctx, cop, use);
+    case IPElementCapabilitiesId: return serveWith<CMPIIPElementCapabilities>(ctx, cop, use);
+    case IPHostedServiceId: return serveWith<CMPIIPHostedService>(ctx, cop, use);
+    case IPServiceAffectsElementId: return serveWith<CMPIServiceAffectsElement>(ctx, cop, use);
+    default: return false;
     }
 }
 
-// Builds the instance adapter that serves classId over cop and hands it to use; the association
-// classes are enumerated (and got) through their association adapters over the class path.
-// False when no adapter serves the class.
-template <class Use>
-bool withInstanceAdapter(unsigned short classId, const CMPIContext* ctx, const CMPIObjectPath* cop, Use&& use) {
-    switch (classId) {
-    case IPProtocolEndpointId: {
-        CMPIProtocolEndpoint adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPAssignmentSettingDataId: {
-        CMPIAssignmentSettingData adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case StaticIPAssignmentSettingDataId: {
-        CMPIStaticIPAssignmentSettingData adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPRemoteServiceAccessPointId: {
-        CMPIRemoteServiceAccessPoint adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPEnabledLogicalElementCapabilitiesId: {
-        CMPIIPEnabledLogicalElementCapabilities adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPConfigurationServiceId: {
-        CMPIIPConfigurationService adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    default:
-        return withAssociationAdapter(classId, ctx, cop, use);
-    }
-}
-
-// The modifiable classes.
+// The adapter that modifies instances of classId. False for the classes that cannot be modified.
 template <class Use>
 bool withModifiableAdapter(unsigned short classId, const CMPIContext* ctx, const CMPIObjectPath* cop, Use&& use) {
     switch (classId) {
-    case IPProtocolEndpointId: {
-        CMPIProtocolEndpoint adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPAssignmentSettingDataId: {
-        CMPIAssignmentSettingData adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case StaticIPAssignmentSettingDataId: {
-        CMPIStaticIPAssignmentSettingData adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    case IPRemoteServiceAccessPointId: {
-        CMPIRemoteServiceAccessPoint adapter(broker, ctx, cop);
-        use(adapter);
-        return true;
-    }
-    default:
-        return false;
+    case IPProtocolEndpointId: return serveWith<CMPIProtocolEndpoint>(ctx, cop, use);
+    case IPAssignmentSettingDataId: return serveWith<CMPIAssignmentSettingData>(ctx, cop, use);
+    case StaticIPAssignmentSettingDataId: return serveWith<CMPIStaticIPAssignmentSettingData>(ctx, cop, use);
+    case IPRemoteServiceAccessPointId: return serveWith<CMPIRemoteServiceAccessPoint>(ctx, cop, use);
+    default: return false;
     }
 }
 
-bool isServedAssociation(unsigned short classId) {
+// The adapter that enumerates instances of classId; the association classes are enumerated (and
+// got) through their association adapters over the class path. False when none serves the class.
+template <class Use>
+bool withInstanceAdapter(unsigned short classId, const CMPIContext* ctx, const CMPIObjectPath* cop, Use&& use) {
     switch (classId) {
-    case BindsToLanEndPointId:
-    case IPElementSettingDataId:
-    case StaticOrderedComponentId:
-    case IPHostedAccessPointId:
-    case StaticIPElementSettingDataId:
-    case RemoteHostedAccessPointId:
-    case IPRemoteAccessAvailableToElementId:
-    case SPHostedAccessPointId:
-    case IPElementCapabilitiesId:
-    case IPHostedServiceId:
-    case IPServiceAffectsElementId:
-        return true;
+    case IPEnabledLogicalElementCapabilitiesId:
+        return serveWith<CMPIIPEnabledLogicalElementCapabilities>(ctx, cop, use);
+    case IPConfigurationServiceId: return serveWith<CMPIIPConfigurationService>(ctx, cop, use);
     default:
-        return false;
+        return withModifiableAdapter(classId, ctx, cop, use) || withAssociationAdapter(classId, ctx, cop, use);
     }
 }
 
@@ -224,7 +123,89 @@ void returnObjectPath(const CMPIResult* rslt, CMPIObjectPath* path) {
     if (path) CMReturnObjectPath(rslt, path);
 }
 
+// Produces one result per element of the adapter, then signals the end of results. An exception
+// leaves before the end signal.
+template <class Adapter, class Produce>
+void returnEach(Adapter& adapter, const CMPIResult* rslt, Produce& produce) {
+    while (adapter) {
+        produce(adapter);
+        ++adapter;
+    }
+    CMReturnDone(rslt);
+}
+
 void logCaught(const std::exception& e) { NX_MESSAGE(loggerIPInterfaceProvider, 4000, e.what()); }
+
+// Get, enumerate and enumerate names: the class of cop picks the adapter. A get whose path leaves
+// keys out gets every matching instance; one whose keys match nothing gets none, and still rc 0.
+template <class Produce>
+CMPIStatus serveInstances(const CMPIContext* ctx, const CMPIResult* rslt, const CMPIObjectPath* cop, bool isGet,
+                          Produce&& produce) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(cop);
+        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
+        if (isGet && classId == IPElementCapabilitiesId) {
+            status.rc = CMPI_RC_ERR_NOT_SUPPORTED;
+        } else if (!withInstanceAdapter(classId, ctx, cop, [&](auto& adapter) { returnEach(adapter, rslt, produce); })) {
+            status.rc = CMPI_RC_ERR_INVALID_CLASS;
+        }
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    return status;
+}
+
+// References and reference names: the result class names the association.
+template <class Produce>
+CMPIStatus serveReferences(const CMPIContext* ctx, const CMPIResult* rslt, const CMPIObjectPath* cop,
+                           const char* resultClass, Produce&& produce) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        unsigned short classId = ProviderUtilities::getClassId(resultClass);
+        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
+        NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
+        if (!withAssociationAdapter(classId, ctx, cop, [&](auto& adapter) { returnEach(adapter, rslt, produce); }))
+            status.rc = CMPI_RC_ERR_INVALID_CLASS;
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    return status;
+}
+
+// Associators and associator names over the identifiers the association class expands to. An
+// association class the provider does not know gives success and no results. What the walk set
+// stands when an adapter throws.
+template <class Produce>
+CMPIStatus serveAssociators(const CMPIContext* ctx, const CMPIResult* rslt, const CMPIObjectPath* cop,
+                            const char* assocClass, const char* resultClass, Produce&& produce) {
+    CMPIStatus status = {CMPI_RC_OK, nullptr};
+    try {
+        NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
+        NX_VAR(loggerIPInterfaceProvider, "associationClass", orEmpty(assocClass));
+        std::vector<unsigned short> ids;
+        if (!getClassId(assocClass, ProviderUtilities::getNamespace(cop).c_str(), ids)) {
+            NX_VAR(loggerIPInterfaceProvider, "CMPI_RC_ERR_INVALID_CLASS",
+                   static_cast<unsigned>(CMPI_RC_ERR_INVALID_CLASS));
+        }
+        for (unsigned short id : ids) {
+            bool served = withAssociationAdapter(id, ctx, cop, [&](auto& adapter) {
+                // An empty result class filters as little as none.
+                if (resultClass && *resultClass && adapter.isNotTargetClass(resultClass)) return;
+                while (adapter) {
+                    produce(adapter);
+                    ++adapter;
+                }
+            });
+            if (!served) status.rc = CMPI_RC_ERR_INVALID_CLASS;
+            NX_VAR(loggerIPInterfaceProvider, "rcode", static_cast<unsigned>(status.rc));
+        }
+        CMReturnDone(rslt);
+    } catch (const std::exception& e) {
+        logCaught(e);
+    }
+    return status;
+}
 
 }  // namespace
 
@@ -281,21 +262,8 @@ CMPIStatus IPInterface_MethodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBool
 CMPIStatus IPInterface_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                          const CMPIObjectPath* cop) {
     ENTRY_MARK();
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    try {
-        unsigned short classId = ProviderUtilities::getClassId(cop);
-        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
-        bool served = withInstanceAdapter(classId, ctx, cop, [&](auto& adapter) {
-            while (adapter) {
-                returnObjectPath(rslt, adapter.getObjectPath());
-                ++adapter;
-            }
-            CMReturnDone(rslt);
-        });
-        if (!served) status.rc = CMPI_RC_ERR_INVALID_CLASS;
-    } catch (const std::exception& e) {
-        logCaught(e);
-    }
+    CMPIStatus status =
+        serveInstances(ctx, rslt, cop, false, [&](auto& adapter) { returnObjectPath(rslt, adapter.getObjectPath()); });
     EXIT_MARK();
     return status;
 }
@@ -303,21 +271,8 @@ CMPIStatus IPInterface_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* ctx
 CMPIStatus IPInterface_EnumInstances(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                      const CMPIObjectPath* cop, const char** properties) {
     ENTRY_MARK();
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    try {
-        unsigned short classId = ProviderUtilities::getClassId(cop);
-        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
-        bool served = withInstanceAdapter(classId, ctx, cop, [&](auto& adapter) {
-            while (adapter) {
-                returnInstance(rslt, adapter.getCMPIInstance(properties));
-                ++adapter;
-            }
-            CMReturnDone(rslt);
-        });
-        if (!served) status.rc = CMPI_RC_ERR_INVALID_CLASS;
-    } catch (const std::exception& e) {
-        logCaught(e);
-    }
+    CMPIStatus status = serveInstances(
+        ctx, rslt, cop, false, [&](auto& adapter) { returnInstance(rslt, adapter.getCMPIInstance(properties)); });
     EXIT_MARK();
     return status;
 }
@@ -325,27 +280,8 @@ CMPIStatus IPInterface_EnumInstances(CMPIInstanceMI*, const CMPIContext* ctx, co
 CMPIStatus IPInterface_GetInstance(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                    const CMPIObjectPath* cop, const char** properties) {
     ENTRY_MARK();
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    try {
-        unsigned short classId = ProviderUtilities::getClassId(cop);
-        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
-        if (classId == IPElementCapabilitiesId) {
-            status.rc = CMPI_RC_ERR_NOT_SUPPORTED;
-        } else {
-            // A path that leaves keys out gets every matching instance; one that matches nothing
-            // gets none, and still rc 0.
-            bool served = withInstanceAdapter(classId, ctx, cop, [&](auto& adapter) {
-                while (adapter) {
-                    returnInstance(rslt, adapter.getCMPIInstance(properties));
-                    ++adapter;
-                }
-                CMReturnDone(rslt);
-            });
-            if (!served) status.rc = CMPI_RC_ERR_INVALID_CLASS;
-        }
-    } catch (const std::exception& e) {
-        logCaught(e);
-    }
+    CMPIStatus status = serveInstances(
+        ctx, rslt, cop, true, [&](auto& adapter) { returnInstance(rslt, adapter.getCMPIInstance(properties)); });
     EXIT_MARK();
     return status;
 }
@@ -395,25 +331,9 @@ CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext* ctx, co
                                   const CMPIObjectPath* cop, const char* resultClass, const char*,
                                   const char** properties) {
     ENTRY_MARK();
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    try {
-        unsigned short classId = ProviderUtilities::getClassId(resultClass);
-        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
-        NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
-        if (!isServedAssociation(classId)) {
-            status.rc = CMPI_RC_ERR_INVALID_CLASS;
-        } else {
-            withAssociationAdapter(classId, ctx, cop, [&](auto& adapter) {
-                while (adapter) {
-                    returnInstance(rslt, adapter.getCMPIInstance(properties));
-                    ++adapter;
-                }
-                CMReturnDone(rslt);
-            });
-        }
-    } catch (const std::exception& e) {
-        logCaught(e);
-    }
+    CMPIStatus status = serveReferences(ctx, rslt, cop, resultClass, [&](auto& adapter) {
+        returnInstance(rslt, adapter.getCMPIInstance(properties));
+    });
     EXIT_MARK();
     return status;
 }
@@ -421,74 +341,19 @@ CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext* ctx, co
 CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                       const CMPIObjectPath* cop, const char* resultClass, const char*) {
     ENTRY_MARK();
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    try {
-        unsigned short classId = ProviderUtilities::getClassId(resultClass);
-        NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
-        NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
-        if (!isServedAssociation(classId)) {
-            status.rc = CMPI_RC_ERR_INVALID_CLASS;
-        } else {
-            withAssociationAdapter(classId, ctx, cop, [&](auto& adapter) {
-                while (adapter) {
-                    returnObjectPath(rslt, adapter.getObjectPath());
-                    ++adapter;
-                }
-                CMReturnDone(rslt);
-            });
-        }
-    } catch (const std::exception& e) {
-        logCaught(e);
-    }
+    CMPIStatus status = serveReferences(ctx, rslt, cop, resultClass,
+                                        [&](auto& adapter) { returnObjectPath(rslt, adapter.getObjectPath()); });
     EXIT_MARK();
     return status;
 }
-
-namespace {
-
-// The shared walk of associators and associator names over the identifiers the association class
-// expands to. An association class the provider does not know gives success and no results. The
-// status is the caller's, so that what the walk set stands when an adapter throws.
-template <class PerElement>
-void associatorWalk(CMPIStatus& status, const CMPIContext* ctx, const CMPIObjectPath* cop, const char* assocClass,
-                    const char* resultClass, const CMPIResult* rslt, PerElement&& perElement) {
-    NX_VAR(loggerIPInterfaceProvider, "resultClass", orEmpty(resultClass));
-    NX_VAR(loggerIPInterfaceProvider, "associationClass", orEmpty(assocClass));
-    std::vector<unsigned short> ids;
-    if (!getClassId(assocClass, ProviderUtilities::getNamespace(cop).c_str(), ids)) {
-        NX_VAR(loggerIPInterfaceProvider, "CMPI_RC_ERR_INVALID_CLASS", static_cast<unsigned>(CMPI_RC_ERR_INVALID_CLASS));
-    }
-    for (unsigned short id : ids) {
-        if (!isServedAssociation(id)) {
-            status.rc = CMPI_RC_ERR_INVALID_CLASS;
-        } else {
-            withAssociationAdapter(id, ctx, cop, [&](auto& adapter) {
-                // An empty result class filters as little as none.
-                if (resultClass && *resultClass && adapter.isNotTargetClass(resultClass)) return;
-                while (adapter) {
-                    perElement(adapter);
-                    ++adapter;
-                }
-            });
-        }
-        NX_VAR(loggerIPInterfaceProvider, "rcode", static_cast<unsigned>(status.rc));
-    }
-    CMReturnDone(rslt);
-}
-
-}  // namespace
 
 CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                    const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
                                    const char*, const char*, const char** properties) {
     ENTRY_MARK();
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    try {
-        associatorWalk(status, ctx, cop, assocClass, resultClass, rslt,
-                       [&](auto& adapter) { returnInstance(rslt, adapter.getAssociator(properties)); });
-    } catch (const std::exception& e) {
-        logCaught(e);
-    }
+    CMPIStatus status = serveAssociators(ctx, rslt, cop, assocClass, resultClass, [&](auto& adapter) {
+        returnInstance(rslt, adapter.getAssociator(properties));
+    });
     EXIT_MARK();
     return status;
 }
@@ -497,13 +362,9 @@ CMPIStatus IPInterface_AssociatorNames(CMPIAssociationMI*, const CMPIContext* ct
                                        const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
                                        const char*, const char*) {
     ENTRY_MARK();
-    CMPIStatus status = {CMPI_RC_OK, nullptr};
-    try {
-        associatorWalk(status, ctx, cop, assocClass, resultClass, rslt,
-                       [&](auto& adapter) { returnObjectPath(rslt, adapter.getAssociatorNames()); });
-    } catch (const std::exception& e) {
-        logCaught(e);
-    }
+    CMPIStatus status = serveAssociators(ctx, rslt, cop, assocClass, resultClass, [&](auto& adapter) {
+        returnObjectPath(rslt, adapter.getAssociatorNames());
+    });
     EXIT_MARK();
     return status;
 }
