@@ -42,7 +42,6 @@ public:
 
     bool write(const std::string& nodePath, unsigned int property, const PropertyValue& value) override {
         std::lock_guard<std::mutex> lock(mutex_);
-        if (refuseWrites_) return false;
         int index = tree_->find(nodePath);
         if (index < 0) return false;
         auto next = std::make_shared<Tree>(*tree_);
@@ -60,12 +59,6 @@ public:
     }
 
     std::string describe() const override { return "test"; }
-
-    // Makes every later write fail as a host refusing the change would.
-    void refuseWrites(bool refuse) {
-        std::lock_guard<std::mutex> lock(mutex_);
-        refuseWrites_ = refuse;
-    }
 
     std::vector<Write> writes() const {
         std::lock_guard<std::mutex> lock(mutex_);
@@ -89,7 +82,6 @@ private:
     mutable std::mutex mutex_;
     std::shared_ptr<const Tree> tree_;
     std::vector<Write> writes_;
-    bool refuseWrites_ = false;
 };
 
 // Builds a tree shaped like the host: a system node at the root, LAN port nodes (12) under the

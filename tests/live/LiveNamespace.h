@@ -9,6 +9,7 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <climits>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -59,6 +60,12 @@ inline void spit(const std::string& path, const std::string& content) {
     std::ofstream(path) << content;
 }
 
+inline std::string hostName() {
+    char name[HOST_NAME_MAX + 1] = {};
+    ::gethostname(name, sizeof name - 1);
+    return name;
+}
+
 inline std::string dottedMask(int prefix) {
     std::string mask;
     for (int octet = 0; octet < 4; ++octet) {
@@ -74,7 +81,6 @@ struct IpView {
     bool up = false;
     std::vector<std::string> ipv4;  // primary addresses, address/prefix, in ip's order
     std::vector<std::string> ipv6;  // global addresses, address/prefix
-    bool dynamic4 = false, dynamic6 = false;  // the first of each has a limited lifetime
     std::string gateway4, gateway6;
 };
 
@@ -94,15 +100,8 @@ inline std::map<std::string, IpView> askIp() {
         const std::vector<std::string> w = words(line);
         if (w.size() < 4) continue;
         IpView& v = view[w[1]];
-        const bool dynamic = line.find(" valid_lft forever ") == std::string::npos;
-        if (w[2] == "inet" && line.find(" secondary ") == std::string::npos) {
-            if (v.ipv4.empty()) v.dynamic4 = dynamic;
-            v.ipv4.push_back(w[3]);
-        }
-        if (w[2] == "inet6" && line.find(" scope global ") != std::string::npos) {
-            if (v.ipv6.empty()) v.dynamic6 = dynamic;
-            v.ipv6.push_back(w[3]);
-        }
+        if (w[2] == "inet" && line.find(" secondary ") == std::string::npos) v.ipv4.push_back(w[3]);
+        if (w[2] == "inet6" && line.find(" scope global ") != std::string::npos) v.ipv6.push_back(w[3]);
     }
     for (const char* family : {"-4", "-6"}) {
         for (const std::string& line : lines(run(std::string("ip ") + family + " route show default table main"))) {

@@ -78,14 +78,12 @@ inline std::string render(const CMPIData& d, const CMPIStatus& rc) {
 
 inline std::string prop(const CMPIInstance* instance, const char* name) {
     CMPIStatus rc = {CMPI_RC_OK, nullptr};
-    CMPIData d = CMGetProperty(instance, name, &rc);
-    return render(d, rc);
+    return render(CMGetProperty(instance, name, &rc), rc);
 }
 
 inline std::string key(const CMPIObjectPath* path, const char* name) {
     CMPIStatus rc = {CMPI_RC_OK, nullptr};
-    CMPIData d = CMGetKey(path, name, &rc);
-    return render(d, rc);
+    return render(CMGetKey(path, name, &rc), rc);
 }
 
 inline std::vector<std::string> keyNames(const CMPIObjectPath* path) {

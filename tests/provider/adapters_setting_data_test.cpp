@@ -21,7 +21,7 @@ using SettingDataAdapter = AdapterTest;
 
 TEST_F(SettingDataAdapter, StaticSettingsComeFromTheFileOrTheLiveNode) {
     useFixture("host-basic.model");
-    testfiles::writeFile(ifcfg("eth0"), "IPV4ADDR=192.168.1.99\nGATEWAY=192.168.1.254\nCONFIG_NAME=lab\n");
+    testfiles::writeFile(ifcfg("eth0"), "IPV4ADDR=192.168.1.99\nGATEWAY=192.168.1.254\nCONFIG_NAME=lab\nPREFIX=48x\n");
     CMPIStaticIPAssignmentSettingData adapter(broker, nullptr, path(kStatic));
     std::vector<CMPIInstance*> found = walk(adapter);
     ASSERT_EQ(found.size(), 5u);
@@ -30,16 +30,17 @@ TEST_F(SettingDataAdapter, StaticSettingsComeFromTheFileOrTheLiveNode) {
     EXPECT_EQ(prop(found[0], "IPv4Address"), "string:192.168.1.99");
     EXPECT_EQ(prop(found[0], "GatewayIPv4Address"), "string:192.168.1.254");
     EXPECT_EQ(prop(found[0], "ConfigurationName"), "string:lab");
+    EXPECT_EQ(prop(found[0], "IPv6SubnetPrefixLength"), "uint16:48");
+    EXPECT_EQ(prop(found[0], "SubnetMask"), "string:");  // a key missing from the file reads empty
     EXPECT_EQ(prop(found[2], "IPv4Address"), "string:172.16.5.20");  // eth2 has no file
     EXPECT_EQ(prop(found[2], "GatewayIPv6Address"), "string:2001:db8:5::1");
     EXPECT_EQ(prop(found[2], "IPv6SubnetPrefixLength"), "uint16:64");
     EXPECT_EQ(prop(found[4], "InstanceID"), "string:BMC%usb0");
 
     CMPIStaticIPAssignmentSettingData keyed(broker, nullptr, path(kStatic, {{"InstanceID", "Computer%eth2"}}));
-    ASSERT_EQ(walk(keyed).size(), 1u);
-    CMPIStaticIPAssignmentSettingData again(broker, nullptr, path(kStatic, {{"InstanceID", "Computer%eth2"}}));
-    EXPECT_EQ(keyNames(again.getObjectPath()), (std::vector<std::string>{"InstanceID"}));
-    EXPECT_EQ(key(again.getObjectPath(), "InstanceID"), "string:Computer%eth2");
+    EXPECT_EQ(keyNames(keyed.getObjectPath()), (std::vector<std::string>{"InstanceID"}));
+    EXPECT_EQ(key(keyed.getObjectPath(), "InstanceID"), "string:Computer%eth2");
+    EXPECT_EQ(walk(keyed).size(), 1u);
 }
 
 TEST_F(SettingDataAdapter, IPv6AddressTypeFallsBackToTheAddressTypeAndAddressTypeIsNeverSet) {
@@ -113,6 +114,10 @@ TEST_F(SettingDataAdapter, AssignmentSettingsComeInPairsAndModifyOnlyTouchesTheC
     EXPECT_EQ(key(keyed.getObjectPath(), "InstanceID"), "string:Computer%eth1%dhcp");
     EXPECT_EQ(statusText(keyed.modifyInstance(instance(p, {{"ConfigurationName", "home"}, {"ElementName", "x"}}))),
               "0:(null)");
+    EXPECT_EQ(testfiles::readFile(ifcfg("eth1")), "DEVICE=eth1\nCONFIG_NAME=home\n");
+    // The file layer is the only guard of this value: an unsafe one is refused there, and logged.
+    EXPECT_EQ(statusText(keyed.modifyInstance(instance(p, {{"ConfigurationName", "a;reboot"}}))), "0:(null)");
+    EXPECT_EQ(logged("Refused to write a configuration value"), 1u);
     EXPECT_EQ(testfiles::readFile(ifcfg("eth1")), "DEVICE=eth1\nCONFIG_NAME=home\n");
     EXPECT_EQ(statusText(keyed.modifyInstance(instance(p, {}))), "0:(null)");
     EXPECT_EQ(testfiles::readFile(ifcfg("eth1")), "DEVICE=eth1\nCONFIG_NAME=\n");

@@ -11,11 +11,10 @@
 
 #include <gtest/gtest.h>
 
-#include <cctype>
 #include <filesystem>
-#include <map>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "TestFiles.h"
@@ -25,6 +24,17 @@
 namespace assoctest {
 
 const std::string kSource = IPIF_SOURCE_DIR;
+// The short form kinds and their classes.
+const std::vector<std::pair<std::string, std::string>> kKinds = {
+    {"EP", "KVRNX_IPProtocolEndpoint"},
+    {"SAP", "KVRNX_IPRemoteServiceAccessPoint"},
+    {"LAN", "KVRNX_LANEndpoint"},
+    {"ASD", "KVRNX_IPAssignmentSettingData"},
+    {"ST", "KVRNX_StaticIPAssignmentSettingData"},
+    {"CAPS", "KVRNX_IPEnabledLogicalElementCapabilities"},
+    {"CS", "KVRNX_ComputerSystem"},
+    {"SP", "KVRNX_SPComputerSystem"},
+    {"SVC", "KVRNX_IPConfigurationService"}};
 
 class AssocTest : public ::testing::Test {
 protected:
@@ -43,82 +53,63 @@ protected:
         return *host_;
     }
 
+    static std::string classOf(const std::string& kind) {
+        for (const auto& [k, cls] : kKinds)
+            if (k == kind) return cls;
+        return "";
+    }
     std::string systemOf(const std::string& name) const { return name == "usb0" ? "BMC:-1" : hostName; }
     std::string systemClassOf(const std::string& name) const {
         return name == "usb0" ? "KVRNX_SPComputerSystem" : "KVRNX_ComputerSystem";
     }
 
-    // The request path of a short form; a bare class name gives the keyless class path.
+    // The request path of a short form; anything else is taken as path text (a bare class name
+    // gives the keyless class path).
     ipif::ObjectPath path(const std::string& form) {
         const auto colon = form.find(':');
-        const std::string kind = form.substr(0, colon);
+        const std::string kind = form.substr(0, colon), cls = classOf(kind);
         std::string arg = colon == std::string::npos ? "" : form.substr(colon + 1);
         if (arg.size() > 4 && arg.compare(arg.size() - 4, 4, "/BMC") == 0) arg.resize(arg.size() - 4);
         const auto q = [](const std::string& v) { return ipif::quote(v); };
-        std::string text;
-        if (kind == "EP" || kind == "SAP" || kind == "LAN") {
-            const std::string cls = kind == "EP"    ? "KVRNX_IPProtocolEndpoint"
-                                    : kind == "SAP" ? "KVRNX_IPRemoteServiceAccessPoint"
-                                                    : "KVRNX_LANEndpoint";
-            const std::string iface = arg.substr(0, arg.find('_'));
-            text = cls +
-                   ".SystemCreationClassName=" + q(kind == "LAN" ? "KVRNX_ComputerSystem" : systemClassOf(iface)) +
+        const std::string iface = arg.substr(0, arg.find('_'));
+        std::string text = form;
+        if (kind == "EP" || kind == "SAP" || kind == "LAN")
+            text = cls + ".SystemCreationClassName=" + q(kind == "LAN" ? classOf("CS") : systemClassOf(iface)) +
                    ",SystemName=" + q(systemOf(iface)) + ",CreationClassName=" + q(cls) + ",Name=" + q(arg);
-        } else if (kind == "ASD" || kind == "ST" || kind == "CAPS") {
-            text = std::string(kind == "ASD"  ? "KVRNX_IPAssignmentSettingData"
-                               : kind == "ST" ? "KVRNX_StaticIPAssignmentSettingData"
-                                              : "KVRNX_IPEnabledLogicalElementCapabilities") +
-                   ".InstanceID=" + q(arg);
-        } else if (kind == "CS") {
-            text = "KVRNX_ComputerSystem.CreationClassName=\"KVRNX_ComputerSystem\",Name=" + q(hostName);
-        } else if (kind == "SP") {
-            text = "KVRNX_SPComputerSystem.CreationClassName=\"KVRNX_SPComputerSystem\",Name=\"BMC:-1\"";
-        } else if (kind == "SVC") {
-            text = "KVRNX_IPConfigurationService.SystemCreationClassName=\"KVRNX_ComputerSystem\",SystemName=" +
-                   q(hostName) + ",CreationClassName=\"KVRNX_IPConfigurationService\",Name=\"IPConfigService\"";
-        } else {
-            text = form;
-        }
+        else if (kind == "ASD" || kind == "ST" || kind == "CAPS")
+            text = cls + ".InstanceID=" + q(arg);
+        else if (kind == "CS" || kind == "SP")
+            text = cls + ".CreationClassName=" + q(cls) + ",Name=" + q(kind == "CS" ? hostName : "BMC:-1");
+        else if (kind == "SVC")
+            text = cls + ".SystemCreationClassName=\"KVRNX_ComputerSystem\",SystemName=" + q(hostName) +
+                   ",CreationClassName=" + q(cls) + ",Name=\"IPConfigService\"";
         return host().parsePath(text);
     }
 
-    // The short form of a result path.
+    // The short form of a result path; a system that is not the expected one shows as "/<name>".
     std::string shortForm(const ipif::ObjectPath& p) const {
-        static const std::map<std::string, std::string> kinds = {{"kvrnx_ipprotocolendpoint", "EP"},
-                                                                 {"kvrnx_ipassignmentsettingdata", "ASD"},
-                                                                 {"kvrnx_staticipassignmentsettingdata", "ST"},
-                                                                 {"kvrnx_ipremoteserviceaccesspoint", "SAP"},
-                                                                 {"kvrnx_ipenabledlogicalelementcapabilities", "CAPS"},
-                                                                 {"kvrnx_lanendpoint", "LAN"},
-                                                                 {"kvrnx_computersystem", "CS"},
-                                                                 {"kvrnx_spcomputersystem", "SP"},
-                                                                 {"kvrnx_ipconfigurationservice", "SVC"}};
-        std::string cls;
-        for (char c : p.className) cls += static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
-        auto kind = kinds.find(cls);
-        if (kind == kinds.end()) return p.className;
+        std::string kind;
+        for (const auto& [k, cls] : kKinds)
+            if (ipif::equalsIgnoreCase(cls, p.className)) kind = k;
+        if (kind.empty()) return p.className;
         const auto text = [&](const char* key) {
             const ipif::Value* v = p.keys.find(key);
             return v && !v->isNull() ? v->asString() : std::string("?");
         };
-        if (kind->second == "ASD" || kind->second == "ST" || kind->second == "CAPS")
-            return kind->second + ":" + text("InstanceID");
-        if (kind->second == "CS") return text("Name") == hostName ? "CS" : "CS/" + text("Name");
-        if (kind->second == "SP") return text("Name") == "BMC:-1" ? "SP" : "SP/" + text("Name");
-        std::string form = kind->second == "SVC" ? "SVC" : kind->second + ":" + text("Name");
-        const std::string system = text("SystemName");
+        if (kind == "ASD" || kind == "ST" || kind == "CAPS") return kind + ":" + text("InstanceID");
+        if (kind == "CS" || kind == "SP") {
+            const std::string expected = kind == "CS" ? hostName : "BMC:-1";
+            return text("Name") == expected ? kind : kind + "/" + text("Name");
+        }
+        const std::string form = kind == "SVC" ? kind : kind + ":" + text("Name"), system = text("SystemName");
         if (system == "BMC:-1") return form + "/BMC";
         return system == hostName ? form : form + "/" + system;
     }
-
-    std::vector<std::string> shortForms(const std::vector<ipif::ObjectPath>& paths) const {
+    std::string shortForm(const ipif::Instance& i) const { return shortForm(i.path); }
+    template <class T>
+    std::vector<std::string> shortForms(const std::vector<T>& items) const {
         std::vector<std::string> forms;
-        for (const auto& p : paths) forms.push_back(shortForm(p));
-        return forms;
-    }
-    std::vector<std::string> shortForms(const std::vector<ipif::Instance>& instances) const {
-        std::vector<std::string> forms;
-        for (const auto& i : instances) forms.push_back(shortForm(i.path));
+        for (const T& item : items) forms.push_back(shortForm(item));
         return forms;
     }
 

@@ -1,5 +1,5 @@
 // The computer system and LAN endpoint lookups against a broker that answers with chosen
-// enumerations (and failures), and the hosted associations' handling of an association path.
+// enumerations (and failures).
 #include <cmpidt.h>
 #include <cmpift.h>
 #include <cmpimacs.h>
@@ -10,16 +10,13 @@
 #include <vector>
 
 #include "CMPI/CMPIIPComputerSystem.h"
-#include "CMPI/CMPIIPHostedAccessPoint.h"
 #include "CMPI/CMPIIPLanEndPoint.h"
 #include "Nx/Exceptions.h"
-#include "Nx/HostModel.h"
 #include "assoc_fixture.h"
 
 namespace {
 
 using Nx::IPInterfaceProvider::CMPIIPComputerSystem;
-using Nx::IPInterfaceProvider::CMPIIPHostedAccessPoint;
 using Nx::IPInterfaceProvider::CMPIIPLanEndPoint;
 
 // A broker whose enumerate and get up-calls answer from a script; anything else is absent.
@@ -80,24 +77,20 @@ private:
         return self.answer.rc == CMPI_RC_OK && !self.answer.items.empty() ? self.answer.items.front() : nullptr;
     }
 
+    // Past the end: not found; a failing position: failed, and the element is lost.
     static CMPIData getNext(const CMPIEnumeration* en, CMPIStatus* rc) {
         Enumeration& e = *static_cast<Enumeration*>(en->hdl);
-        CMPIData data{};
-        data.type = CMPI_null;
-        data.state = CMPI_nullValue;
-        if (e.next >= e.answer.items.size()) {
-            if (rc) rc->rc = CMPI_RC_ERR_NOT_FOUND;
-            return data;
+        CMPIData data{CMPI_null, CMPI_nullValue, {}};
+        CMPIrc status = CMPI_RC_ERR_NOT_FOUND;
+        if (e.next < e.answer.items.size()) {
+            const size_t at = e.next++;
+            status = e.answer.failingFetches.count(at) ? CMPI_RC_ERR_FAILED : CMPI_RC_OK;
+            if (status == CMPI_RC_OK) {
+                data = CMPIData{CMPI_instance, CMPI_goodValue, {}};
+                data.value.inst = e.answer.items[at];
+            }
         }
-        const size_t at = e.next++;
-        if (e.answer.failingFetches.count(at)) {
-            if (rc) rc->rc = CMPI_RC_ERR_FAILED;
-            return data;
-        }
-        if (rc) rc->rc = CMPI_RC_OK;
-        data.type = CMPI_instance;
-        data.state = CMPI_goodValue;
-        data.value.inst = e.answer.items[at];
+        if (rc) rc->rc = status;
         return data;
     }
     static CMPIBoolean hasNext(const CMPIEnumeration* en, CMPIStatus* rc) {
@@ -114,20 +107,18 @@ private:
 
 class Lookups : public assoctest::AssocTest {
 protected:
-    // A system (or LAN endpoint) instance made by the embedded host's broker.
-    CMPIInstance* system(const std::string& cls, const std::string& name) {
-        const CMPIBroker* b = host().broker();
-        CMPIObjectPath* p = CMNewObjectPath(b, "root/cimv2", cls.c_str(), nullptr);
-        CMAddKey(p, "CreationClassName", cls.c_str(), CMPI_chars);
-        CMAddKey(p, "Name", name.c_str(), CMPI_chars);
-        CMPIInstance* i = CMNewInstance(b, p, nullptr);
-        CMSetProperty(i, "Name", name.c_str(), CMPI_chars);
-        return i;
-    }
     CMPIObjectPath* named(const std::string& cls, const std::string& name) {
         CMPIObjectPath* p = CMNewObjectPath(host().broker(), "root/cimv2", cls.c_str(), nullptr);
         if (!name.empty()) CMAddKey(p, "Name", name.c_str(), CMPI_chars);
         return p;
+    }
+    // A system (or LAN endpoint) instance made by the embedded host's broker.
+    CMPIInstance* system(const std::string& cls, const std::string& name) {
+        CMPIObjectPath* p = named(cls, name);
+        CMAddKey(p, "CreationClassName", cls.c_str(), CMPI_chars);
+        CMPIInstance* i = CMNewInstance(host().broker(), p, nullptr);
+        CMSetProperty(i, "Name", name.c_str(), CMPI_chars);
+        return i;
     }
     static std::string nameOf(CMPIObjectPath* p) {
         if (!p) return "(none)";
@@ -165,8 +156,7 @@ TEST_F(Lookups, ComputerSystemIterationRules) {
         {"a failed fetch is passed over", {"a", "b", "c"}, {1}, true, "b", {"c"}},
         {"and is not the last one kept", {"a", "b", "c"}, {2}, true, "x", {"b"}},
         {"a path without Name keeps the last", {"a", "b"}, {}, true, "", {"b"}},
-        {"empty enumeration", {}, {}, false, "", {}},
-        {"empty enumeration, by name", {}, {}, true, "a", {}},
+        {"empty enumeration", {}, {}, true, "a", {}},
     };
     for (const Row& row : rows) {
         SCOPED_TRACE(row.what);
@@ -229,72 +219,6 @@ TEST_F(Lookups, LanEndpointIsOneShot) {
         EXPECT_THROW(failing.setObjectPath(named(lan, "")), Nx::ProviderException);
         EXPECT_FALSE(static_cast<bool>(failing));
     }
-}
-
-// An association path of a hosted association positions the endpoint it names, and the computer
-// only when that is the endpoint's computer; the constructor then goes on as for a computer path,
-// which the association path is not.
-TEST_F(Lookups, HostedAssociationPathIsTakenApartButNeverServed) {
-    Nx::HostModel::setCurrent(Nx::HostModel::open("fixture:" + model));
-    const CMPIBroker* b = host().broker();
-    auto cmpiPath = [&](const ipif::ObjectPath& p, auto& self) -> CMPIObjectPath* {
-        CMPIObjectPath* out = CMNewObjectPath(b, "root/cimv2", p.className.c_str(), nullptr);
-        for (const auto& [name, value] : p.keys) {
-            if (value.type() == ipif::CimType::Reference) {
-                CMPIValue ref;
-                ref.ref = self(value.asReference(), self);
-                CMAddKey(out, name.c_str(), &ref, CMPI_ref);
-            } else {
-                CMAddKey(out, name.c_str(), value.asString().c_str(), CMPI_chars);
-            }
-        }
-        return out;
-    };
-    auto instancePath = [&](const std::string& computer) {
-        ipif::ObjectPath p("root/cimv2", "KVRNX_IPHostedAccessPoint");
-        ipif::ObjectPath cs("root/cimv2", "KVRNX_ComputerSystem");
-        cs.keys.set("CreationClassName", ipif::Value::string("KVRNX_ComputerSystem"));
-        cs.keys.set("Name", ipif::Value::string(computer));
-        p.keys.set("Antecedent", ipif::Value::reference(cs));
-        p.keys.set("Dependent", ipif::Value::reference(path("EP:eth1")));
-        return cmpiPath(p, cmpiPath);
-    };
-    CMPIObjectPath* service = cmpiPath(path("SVC"), cmpiPath);
-
-    for (const std::string& computer : {hostName, std::string("elsewhere")}) {
-        SCOPED_TRACE(computer);
-        CMPIIPHostedAccessPoint adapter(b, nullptr, service);  // no end of this association
-        EXPECT_FALSE(static_cast<bool>(adapter));
-        EXPECT_EQ(adapter.getAssociatorNames(), nullptr);
-        EXPECT_TRUE(adapter.isNotTargetClass("CIM_ComputerSystem"));
-        EXPECT_FALSE(adapter.setObjectPath(instancePath(computer)));
-        ASSERT_TRUE(static_cast<bool>(adapter));
-        CMPIObjectPath* pair = adapter.getObjectPath();
-        CMPIData dependent = CMGetKey(pair, "Dependent", nullptr);
-        ASSERT_EQ(dependent.type, CMPI_ref);
-        EXPECT_EQ(nameOf(dependent.value.ref), "eth1");
-        CMPIStatus rc = {CMPI_RC_OK, nullptr};
-        CMPIData antecedent = CMGetKey(pair, "Antecedent", &rc);
-        if (computer == hostName) {
-            ASSERT_EQ(antecedent.type, CMPI_ref);
-            EXPECT_EQ(nameOf(antecedent.value.ref), hostName);
-        } else {
-            EXPECT_NE(rc.rc, CMPI_RC_OK);
-        }
-    }
-    CMPIIPHostedAccessPoint keyless(b, nullptr, service);
-    EXPECT_TRUE(keyless.setObjectPath(CMNewObjectPath(b, "root/cimv2", "KVRNX_IPHostedAccessPoint", nullptr)));
-    int pairs = 0;
-    for (; keyless; ++keyless) ++pairs;
-    EXPECT_EQ(pairs, 4);
-
-    try {
-        CMPIIPHostedAccessPoint fromInstancePath(b, nullptr, instancePath(hostName));
-        ADD_FAILURE() << "no exception";
-    } catch (const Nx::FrameworkException& e) {
-        EXPECT_STREQ(e.what(), "Could not find 'Name' key in Moniker");
-    }
-    Nx::HostModel::setCurrent(nullptr);
 }
 
 }  // namespace
