@@ -19,24 +19,23 @@ const AssociationClass kAssociation = {
 CMPIBindsToLanEndpoint::CMPIBindsToLanEndpoint(const CMPIBroker* broker_, const CMPIContext* context_,
                                                const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIBindsToLanEndpoint, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIBindsToLanEndpoint, params.c_str());
-    switch (requestedClassId) {
-        case LANEndpointId:
-            fromB(path, &CMPIBindsToLanEndpoint::getIPEndptPath);
-            break;
-        case BindsToLanEndPointId:
-            // The endpoints are walked; the LAN end is looked up once, from the first of them.
-            if (endA) endB.setObjectPath(getLanEndptPath(endA.getObjectPath()));
-            walk(Side::A);
-            break;
-        case IPProtocolEndpointId:
-            fromA(path, &CMPIBindsToLanEndpoint::getLanEndptPath);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIBindsToLanEndpoint, params.c_str());
+    construct(__func__, path, [&] {
+        switch (requestedClassId) {
+            case LANEndpointId:
+                fromB(path, &CMPIBindsToLanEndpoint::getIPEndptPath);
+                break;
+            case BindsToLanEndPointId:
+                // The endpoints are walked; the LAN end is looked up once, from the first of them.
+                if (endA) endB.setObjectPath(getLanEndptPath(endA.getObjectPath()));
+                walk(Side::A);
+                break;
+            case IPProtocolEndpointId:
+                fromA(path, &CMPIBindsToLanEndpoint::getLanEndptPath);
+                break;
+            default:
+                break;
+        }
+    });
 }
 
 CMPIObjectPath* CMPIBindsToLanEndpoint::getIPEndptPath(const CMPIObjectPath* path) {

@@ -18,80 +18,40 @@ namespace IPInterfaceProvider {
 
 static const std::string loggerCMPIIPConfigurationService = "Tarvo.IPInterfaceProvider";
 
-namespace {
-
-// A method argument; an absent argument (or no argument list) reads as untyped.
-CMPIData methodArgument(const CMPIArgs* in, const char* name) {
-    CMPIData data = {};
-    data.type = CMPI_null;
-    data.state = CMPI_notFound;
-    if (!in) return data;
-    CMPIStatus rc = {CMPI_RC_OK, nullptr};
-    CMPIData found = CMGetArg(in, name, &rc);
-    if (rc.rc != CMPI_RC_OK || (found.state & CMPI_notFound)) return data;
-    return found;
-}
-
-}  // namespace
-
 CMPIIPConfigurationService::CMPIIPConfigurationService(const CMPIBroker* broker, const CMPIContext* context,
                                                        const std::string& nameSpace)
-    : CMPIAdapter(broker, context, nameSpace, loggerCMPIIPConfigurationService, NX_FILE) {
-    const std::string params =
-        parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
-    NX_ENTER_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
-    NX_EXIT_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
-}
+    : CMPIAdapter(broker, context, nameSpace, loggerCMPIIPConfigurationService, NX_FILE, __func__) {}
 
 CMPIIPConfigurationService::CMPIIPConfigurationService(const CMPIBroker* broker, const CMPIContext* context,
                                                        const CMPIObjectPath* path)
-    : CMPIAdapter(broker, context, ProviderUtilities::getNamespace(path), loggerCMPIIPConfigurationService,
-                  NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker, " _context=", context, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
-    setObjectPath(path);
-    NX_EXIT_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
+    : CMPIAdapter(broker, context, path, loggerCMPIIPConfigurationService, NX_FILE) {
+    constructedAt(__func__, path, [&] { setObjectPath(path); });
 }
 
 void CMPIIPConfigurationService::setObjectPath(const CMPIObjectPath* path) {
-    const std::string params = parameterList(" objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
-    std::string systemName;
-    if (ProviderUtilities::getKeyCount(path) != 0 && ProviderUtilities::getKeyProperty(path, "SystemName", systemName)) {
-        NX_VAR(loggerCMPIIPConfigurationService, "SystemName", systemName.c_str());
-        model.setFilter(IPConfigurationService::FilterType::BySystemName, systemName);
-    }
-    NX_EXIT_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
+    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+                 {{"SystemName", IPConfigurationService::FilterType::BySystemName}});
 }
 
 CMPIObjectPath* CMPIIPConfigurationService::getObjectPath() {
-    NX_ENTER(loggerCMPIIPConfigurationService);
-    CMPIObjectPath* path = newClassPath("KVRNX_IPConfigurationService");
-    if (path) {
+    return objectPath(__func__, "KVRNX_IPConfigurationService", [this](CMPIObjectPath* path) {
         using M = IPConfigurationService;
         copyKey(path, "SystemCreationClassName", &M::getSystemCreationClassName);
         copyKey(path, "SystemName", &M::getSystemName);
         copyKey(path, "CreationClassName", &M::getCreationClassName);
         copyKey(path, "Name", &M::getName);
-    }
-    NX_EXIT(loggerCMPIIPConfigurationService);
-    return path;
+    });
 }
 
 CMPIInstance* CMPIIPConfigurationService::getCMPIInstance(const char** properties) {
-    const std::string params = parameterList(" properties=", properties);
-    NX_ENTER_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
-    CMPIInstance* instance = ProviderUtilities::createInstance(broker, getObjectPath());
-    if (instance) {
+    return instanceOf(__func__, properties, nullptr, this, [this](CMPIInstance* instance) {
         using M = IPConfigurationService;
         copyProperty<std::string>(instance, "ElementName", &M::getElementName);
         copyProperty<std::string>(instance, "SystemCreationClassName", &M::getSystemCreationClassName);
         copyProperty<std::string>(instance, "SystemName", &M::getSystemName);
         copyProperty<std::string>(instance, "CreationClassName", &M::getCreationClassName);
         copyProperty<std::string>(instance, "Name", &M::getName);
-    }
-    NX_EXIT_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
-    return instance;
+    });
 }
 
 const char CMPIIPConfigurationService::DNSGeneralSettingDataClass[] = "KVRNX_DNSGeneralSettingData";
@@ -102,8 +62,8 @@ CMPIUint32 CMPIIPConfigurationService::executeMethod(const CMPIArgs* in, CMPIArg
         if (status) *status = makeStatus(rc, text);
     };
 
-    const CMPIData configurationArg = methodArgument(in, "Configuration");
-    const CMPIData endpointArg = methodArgument(in, "Endpoint");
+    const CMPIData configurationArg = argument(in, "Configuration");
+    const CMPIData endpointArg = argument(in, "Endpoint");
     if (configurationArg.type != CMPI_ref || endpointArg.type != CMPI_ref) {
         setStatus(CMPI_RC_ERR_INVALID_PARAMETER, "Invalid Type of Parameter");
         return 4;
@@ -188,15 +148,7 @@ CMPIUint32 CMPIIPConfigurationService::executeMethod(const CMPIArgs* in, CMPIArg
         return 4;
     }
 
-    // The change is made before the method returns: the job is a fixed name, never tracked.
-    if (CMPIObjectPath* job = newClassPath("KVRNX_ConcreteJob")) {
-        ProviderUtilities::setKeyProperty(job, "InstanceID", std::string("IPConfigSvcJob:1"));
-        if (out) {
-            CMPIValue reference;
-            reference.ref = job;
-            CMAddArg(out, "Job", &reference, CMPI_ref);
-        }
-    }
+    returnJob(out);
 
     const bool reboot = isSystemRebootRequired(cfg_data.get());
     const bool configNameEmpty = cfg_data->configNameEmpty;
@@ -229,9 +181,7 @@ CMPIInstance* CMPIIPConfigurationService::getConfiguartionSetting(const char* cl
     CMPIStatus rc = {CMPI_RC_OK, nullptr};
     CMPIEnumeration* instances = CBEnumInstances(broker, context, classPath, nullptr, &rc);
     if (rc.rc != CMPI_RC_OK || !instances) {
-        const std::string error = "Error Status: " + std::to_string(rc.rc) +
-                                  (rc.msg && CMGetCharPtr(rc.msg) ? std::string(" ") + CMGetCharPtr(rc.msg) : "");
-        NX_MESSAGE(loggerCMPIIPConfigurationService, 6000, error.c_str());
+        NX_MESSAGE(loggerCMPIIPConfigurationService, 6000, errorStatusText(rc).c_str());
         NX_MESSAGE(loggerCMPIIPConfigurationService, 6000, "CBAssociators Failed for the CIM_OrderedComponent");
         return leave(nullptr);
     }

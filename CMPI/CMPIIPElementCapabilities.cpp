@@ -20,22 +20,21 @@ const AssociationClass kAssociation = {
 CMPIIPElementCapabilities::CMPIIPElementCapabilities(const CMPIBroker* broker_, const CMPIContext* context_,
                                                      const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIIPElementCapabilities, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIIPElementCapabilities, params.c_str());
-    switch (requestedClassId) {
-        case IPElementCapabilitiesId:
-            walkA(&CMPIIPElementCapabilities::locateCapabilities);
-            break;
-        case IPEnabledLogicalElementCapabilitiesId:
-            fromB(path, &CMPIIPElementCapabilities::locateProtocolEndpt);
-            break;
-        case IPProtocolEndpointId:
-            fromA(path, &CMPIIPElementCapabilities::locateCapabilities);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIIPElementCapabilities, params.c_str());
+    construct(__func__, path, [&] {
+        switch (requestedClassId) {
+            case IPElementCapabilitiesId:
+                walkA(&CMPIIPElementCapabilities::locateCapabilities);
+                break;
+            case IPEnabledLogicalElementCapabilitiesId:
+                fromB(path, &CMPIIPElementCapabilities::locateProtocolEndpt);
+                break;
+            case IPProtocolEndpointId:
+                fromA(path, &CMPIIPElementCapabilities::locateCapabilities);
+                break;
+            default:
+                break;
+        }
+    });
 }
 
 CMPIObjectPath* CMPIIPElementCapabilities::locateProtocolEndpt(const CMPIObjectPath* path) {

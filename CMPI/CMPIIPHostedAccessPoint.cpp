@@ -19,22 +19,8 @@ const AssociationClass kAssociation = {
 CMPIIPHostedAccessPoint::CMPIIPHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_,
                                                  const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIIPHostedAccessPoint, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIIPHostedAccessPoint, params.c_str());
-    switch (requestedClassId) {
-        case IPProtocolEndpointId:
-            fromB(path, &CMPIIPHostedAccessPoint::locateComputer);
-            break;
-        case IPHostedAccessPointId:
-            if (!setObjectPath(path)) fromA(path, &CMPIIPHostedAccessPoint::locateProtocolEndpoint);
-            break;
-        case ComputerSystemId:
-            fromA(path, &CMPIIPHostedAccessPoint::locateProtocolEndpoint);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIIPHostedAccessPoint, params.c_str());
+    constructAnchored(__func__, path, IPHostedAccessPointId, &CMPIIPHostedAccessPoint::locateComputer,
+                      &CMPIIPHostedAccessPoint::locateProtocolEndpoint);
 }
 
 bool CMPIIPHostedAccessPoint::setObjectPath(const CMPIObjectPath* path) {

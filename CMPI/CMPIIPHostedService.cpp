@@ -19,22 +19,8 @@ const AssociationClass kAssociation = {
 CMPIIPHostedService::CMPIIPHostedService(const CMPIBroker* broker_, const CMPIContext* context_,
                                          const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIIPHostedService, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIIPHostedService, params.c_str());
-    switch (requestedClassId) {
-        case IPConfigurationServiceId:
-            fromB(path, &CMPIIPHostedService::locateComputer);
-            break;
-        case IPHostedServiceId:
-            if (!setObjectPath(path)) fromA(path, &CMPIIPHostedService::locateConfigurationService);
-            break;
-        case ComputerSystemId:
-            fromA(path, &CMPIIPHostedService::locateConfigurationService);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIIPHostedService, params.c_str());
+    constructAnchored(__func__, path, IPHostedServiceId, &CMPIIPHostedService::locateComputer,
+                      &CMPIIPHostedService::locateConfigurationService);
 }
 
 bool CMPIIPHostedService::setObjectPath(const CMPIObjectPath* path) {

@@ -5,79 +5,35 @@ namespace IPInterfaceProvider {
 
 static const std::string loggerCMPIProtocolEndpoint = "Tarvo.IPInterfaceProvider";
 
-namespace {
-
-const char* const kClassName = "KVRNX_IPProtocolEndpoint";
-
-// A method argument; an absent argument (or no argument list) reads as untyped.
-CMPIData argument(const CMPIArgs* in, const char* name) {
-    CMPIData data = {};
-    data.type = CMPI_null;
-    data.state = CMPI_notFound;
-    if (!in) return data;
-    CMPIStatus rc = {CMPI_RC_OK, nullptr};
-    CMPIData found = CMGetArg(in, name, &rc);
-    if (rc.rc != CMPI_RC_OK || (found.state & CMPI_notFound)) return data;
-    return found;
-}
-
-}  // namespace
-
 CMPIProtocolEndpoint::CMPIProtocolEndpoint(const CMPIBroker* broker, const CMPIContext* context,
                                            const std::string& nameSpace)
-    : CMPIAdapter(broker, context, nameSpace, loggerCMPIProtocolEndpoint, NX_FILE) {
-    const std::string params =
-        parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
-    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
-    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
-}
+    : CMPIAdapter(broker, context, nameSpace, loggerCMPIProtocolEndpoint, NX_FILE, __func__) {}
 
 CMPIProtocolEndpoint::CMPIProtocolEndpoint(const CMPIBroker* broker, const CMPIContext* context,
                                            const CMPIObjectPath* path)
-    : CMPIAdapter(broker, context, ProviderUtilities::getNamespace(path), loggerCMPIProtocolEndpoint, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker, " _context=", context, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
-    setObjectPath(path);
-    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    : CMPIAdapter(broker, context, path, loggerCMPIProtocolEndpoint, NX_FILE) {
+    constructedAt(__func__, path, [&] { setObjectPath(path); });
 }
 
+// The class keys are ours by construction; only system and interface name select.
 void CMPIProtocolEndpoint::setObjectPath(const CMPIObjectPath* path) {
-    const std::string params = parameterList(" objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
-    // The class keys are ours by construction; only system and interface name select.
-    if (ProviderUtilities::getKeyCount(path) != 0) {
-        std::string value;
-        if (ProviderUtilities::getKeyProperty(path, "SystemName", value)) {
-            NX_VAR(loggerCMPIProtocolEndpoint, "SystemName", value.c_str());
-            model.setFilter(IPprotocolEndpoint::FilterType::BySystemName, value);
-        }
-        if (ProviderUtilities::getKeyProperty(path, "Name", value)) {
-            NX_VAR(loggerCMPIProtocolEndpoint, "Name", value.c_str());
-            model.setFilter(IPprotocolEndpoint::FilterType::ByName, value);
-        }
-    }
-    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
+    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+                 {{"SystemName", IPprotocolEndpoint::FilterType::BySystemName},
+                  {"Name", IPprotocolEndpoint::FilterType::ByName}});
 }
 
 CMPIObjectPath* CMPIProtocolEndpoint::getObjectPath() {
-    NX_ENTER(loggerCMPIProtocolEndpoint);
-    CMPIObjectPath* path = newClassPath(kClassName);
-    if (path) {
+    return objectPath(__func__, "KVRNX_IPProtocolEndpoint", [this](CMPIObjectPath* path) {
         copyKey(path, "Name", &IPprotocolEndpoint::getName);
         copyKey(path, "CreationClassName", &IPprotocolEndpoint::getCreationClassName);
         copyKey(path, "SystemName", &IPprotocolEndpoint::getSystemName);
         copyKey(path, "SystemCreationClassName", &IPprotocolEndpoint::getSystemCreationClassName);
-    }
-    NX_EXIT(loggerCMPIProtocolEndpoint);
-    return path;
+    });
 }
 
 CMPIInstance* CMPIProtocolEndpoint::getCMPIInstance(const char** properties) {
     // The property list is the object manager's to apply; every property is offered.
-    const std::string params = parameterList(" properties=", properties);
-    NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
-    CMPIInstance* instance = ProviderUtilities::createInstance(broker, getObjectPath());
-    if (instance) {
+    return instanceOf(__func__, properties, nullptr, this, [this, function = __func__](CMPIInstance* instance) {
         using M = IPprotocolEndpoint;
         copyProperty<std::string>(instance, "ElementName", &M::getElementName);
         copyProperty<std::string>(instance, "Description", &M::getDescription);
@@ -95,7 +51,7 @@ CMPIInstance* CMPIProtocolEndpoint::getCMPIInstance(const char** properties) {
         copyProperty<unsigned short>(instance, "RequestedState", &M::getRequestedState);
         unsigned short origin = 0;
         if (model.getAddressOrigin(origin)) {
-            NX_VAR(loggerCMPIProtocolEndpoint, "IPOrigin in u16", static_cast<unsigned>(origin));
+            tracer.variable(function, __LINE__, "IPOrigin in u16", static_cast<unsigned>(origin));
             ProviderUtilities::setProperty(instance, "AddressOrigin", origin);
         }
         copyProperty<std::string>(instance, "SystemCreationClassName", &M::getSystemCreationClassName);
@@ -103,9 +59,7 @@ CMPIInstance* CMPIProtocolEndpoint::getCMPIInstance(const char** properties) {
         copyProperty<std::string>(instance, "CreationClassName", &M::getCreationClassName);
         copyProperty<std::string>(instance, "Name", &M::getName);
         copyProperty<std::string>(instance, "NameFormat", &M::getNameFormat);
-    }
-    NX_EXIT_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
-    return instance;
+    });
 }
 
 CMPIStatus CMPIProtocolEndpoint::modifyInstance(const CMPIInstance* newInstance) {
@@ -167,14 +121,7 @@ CMPIUint32 CMPIProtocolEndpoint::executeMethod(const CMPIArgs* in, CMPIArgs* out
     if (!model.setEnabledState(state)) return refuse(CMPI_RC_ERR_FAILED, "Invalid Type of TimeOut Parameter");
 
     NX_MESSAGE(loggerCMPIProtocolEndpoint, 3000, "Calling CMNewObjectPath for ConcreteJob");
-    CMPIObjectPath* job = newClassPath("KVRNX_ConcreteJob");
-    if (!job) return 0;
-    ProviderUtilities::setKeyProperty(job, "InstanceID", std::string("IPConfigSvcJob:1"));
-    if (out) {
-        CMPIValue reference;
-        reference.ref = job;
-        CMAddArg(out, "Job", &reference, CMPI_ref);
-    }
+    if (!returnJob(out)) return 0;
     NX_MESSAGE(loggerCMPIProtocolEndpoint, 3000, "Job Created Successfully");
     return 0;
 }

@@ -20,22 +20,21 @@ CMPIRemoteAccessAvailableToElement::CMPIRemoteAccessAvailableToElement(const CMP
                                                                        const CMPIContext* context_,
                                                                        const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIRemoteAccessAvailableToElement, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIRemoteAccessAvailableToElement, params.c_str());
-    switch (requestedClassId) {
-        case IPRemoteServiceAccessPointId:
-            fromA(path, &CMPIRemoteAccessAvailableToElement::locateIPEndptPath);
-            break;
-        case IPRemoteAccessAvailableToElementId:
-            walkA(&CMPIRemoteAccessAvailableToElement::locateIPEndptPath);
-            break;
-        case IPProtocolEndpointId:
-            fromB(path, &CMPIRemoteAccessAvailableToElement::locateRemoteSAP);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIRemoteAccessAvailableToElement, params.c_str());
+    construct(__func__, path, [&] {
+        switch (requestedClassId) {
+            case IPRemoteServiceAccessPointId:
+                fromA(path, &CMPIRemoteAccessAvailableToElement::locateIPEndptPath);
+                break;
+            case IPRemoteAccessAvailableToElementId:
+                walkA(&CMPIRemoteAccessAvailableToElement::locateIPEndptPath);
+                break;
+            case IPProtocolEndpointId:
+                fromB(path, &CMPIRemoteAccessAvailableToElement::locateRemoteSAP);
+                break;
+            default:
+                break;
+        }
+    });
 }
 
 CMPIObjectPath* CMPIRemoteAccessAvailableToElement::locateRemoteSAP(const CMPIObjectPath* path) {

@@ -19,22 +19,8 @@ const AssociationClass kAssociation = {
 CMPIRemoteHostedAccessPoint::CMPIRemoteHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_,
                                                          const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIRemoteHostedAccessPoint, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIRemoteHostedAccessPoint, params.c_str());
-    switch (requestedClassId) {
-        case IPRemoteServiceAccessPointId:
-            fromB(path, &CMPIRemoteHostedAccessPoint::locateComputer);
-            break;
-        case RemoteHostedAccessPointId:
-            if (!setObjectPath(path)) fromA(path, &CMPIRemoteHostedAccessPoint::locateRemoteSAP);
-            break;
-        case ComputerSystemId:
-            fromA(path, &CMPIRemoteHostedAccessPoint::locateRemoteSAP);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIRemoteHostedAccessPoint, params.c_str());
+    constructAnchored(__func__, path, RemoteHostedAccessPointId, &CMPIRemoteHostedAccessPoint::locateComputer,
+                      &CMPIRemoteHostedAccessPoint::locateRemoteSAP);
 }
 
 bool CMPIRemoteHostedAccessPoint::setObjectPath(const CMPIObjectPath* path) {

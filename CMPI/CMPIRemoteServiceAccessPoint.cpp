@@ -7,58 +7,31 @@ static const std::string loggerCMPIRemoteServiceAccessPoint = "Tarvo.IPInterface
 
 CMPIRemoteServiceAccessPoint::CMPIRemoteServiceAccessPoint(const CMPIBroker* broker, const CMPIContext* context,
                                                            const std::string& nameSpace)
-    : CMPIAdapter(broker, context, nameSpace, loggerCMPIRemoteServiceAccessPoint, NX_FILE) {
-    const std::string params =
-        parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
-    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
-    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
-}
+    : CMPIAdapter(broker, context, nameSpace, loggerCMPIRemoteServiceAccessPoint, NX_FILE, __func__) {}
 
 CMPIRemoteServiceAccessPoint::CMPIRemoteServiceAccessPoint(const CMPIBroker* broker, const CMPIContext* context,
                                                            const CMPIObjectPath* path)
-    : CMPIAdapter(broker, context, ProviderUtilities::getNamespace(path), loggerCMPIRemoteServiceAccessPoint,
-                  NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker, " _context=", context, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
-    setObjectPath(path);
-    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    : CMPIAdapter(broker, context, path, loggerCMPIRemoteServiceAccessPoint, NX_FILE) {
+    constructedAt(__func__, path, [&] { setObjectPath(path); });
 }
 
 void CMPIRemoteServiceAccessPoint::setObjectPath(const CMPIObjectPath* path) {
-    const std::string params = parameterList(" objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
-    if (ProviderUtilities::getKeyCount(path) != 0) {
-        std::string value;
-        if (ProviderUtilities::getKeyProperty(path, "SystemName", value)) {
-            NX_VAR(loggerCMPIRemoteServiceAccessPoint, "SystemName", value.c_str());
-            model.setFilter(RemoteServiceAccessPoint::FilterType::BySystemName, value);
-        }
-        if (ProviderUtilities::getKeyProperty(path, "Name", value)) {
-            NX_VAR(loggerCMPIRemoteServiceAccessPoint, "Name", value.c_str());
-            model.setFilter(RemoteServiceAccessPoint::FilterType::ByName, value);
-        }
-    }
-    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
+    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+                 {{"SystemName", RemoteServiceAccessPoint::FilterType::BySystemName},
+                  {"Name", RemoteServiceAccessPoint::FilterType::ByName}});
 }
 
 CMPIObjectPath* CMPIRemoteServiceAccessPoint::getObjectPath() {
-    NX_ENTER(loggerCMPIRemoteServiceAccessPoint);
-    CMPIObjectPath* path = newClassPath("KVRNX_IPRemoteServiceAccessPoint");
-    if (path) {
+    return objectPath(__func__, "KVRNX_IPRemoteServiceAccessPoint", [this](CMPIObjectPath* path) {
         copyKey(path, "SystemCreationClassName", &RemoteServiceAccessPoint::getSystemCreationClassName);
         copyKey(path, "SystemName", &RemoteServiceAccessPoint::getSystemName);
         copyKey(path, "CreationClassName", &RemoteServiceAccessPoint::getCreationClassName);
         copyKey(path, "Name", &RemoteServiceAccessPoint::getName);
-    }
-    NX_EXIT(loggerCMPIRemoteServiceAccessPoint);
-    return path;
+    });
 }
 
 CMPIInstance* CMPIRemoteServiceAccessPoint::getCMPIInstance(const char** properties) {
-    const std::string params = parameterList(" properties=", properties);
-    NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
-    CMPIInstance* instance = ProviderUtilities::createInstance(broker, getObjectPath(), properties);
-    if (instance) {
+    return instanceOf(__func__, properties, properties, this, [this](CMPIInstance* instance) {
         using M = RemoteServiceAccessPoint;
         copyProperty<std::string>(instance, "ElementName", &M::getElementName);
         copyProperty<std::string>(instance, "AccessInfo", &M::getAccessInfo);
@@ -69,9 +42,7 @@ CMPIInstance* CMPIRemoteServiceAccessPoint::getCMPIInstance(const char** propert
         copyProperty<std::string>(instance, "SystemName", &M::getSystemName);
         copyProperty<std::string>(instance, "CreationClassName", &M::getCreationClassName);
         copyProperty<std::string>(instance, "Name", &M::getName);
-    }
-    NX_EXIT_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
-    return instance;
+    });
 }
 
 CMPIStatus CMPIRemoteServiceAccessPoint::modifyInstance(const CMPIInstance* newInstance) {

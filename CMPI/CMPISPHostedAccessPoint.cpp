@@ -19,30 +19,29 @@ const AssociationClass kAssociation = {
 CMPISPHostedAccessPoint::CMPISPHostedAccessPoint(const CMPIBroker* broker_, const CMPIContext* context_,
                                                  const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPISPHostedAccessPoint, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPISPHostedAccessPoint, params.c_str());
-    switch (requestedClassId) {
-        case SPComputerSystemId:
-            fromA(path, &CMPISPHostedAccessPoint::locateProtocolEndpoint);
-            break;
-        case SPHostedAccessPointId: {
-            CMPIObjectPath* located = locateBMC(path);
-            endA.setObjectPath(located, false);
-            CMPIObjectPath* found = endA.getObjectPath();
-            endB.setObjectPath(locateProtocolEndpoint(found ? found : located));
-            walk(Side::B);
-            break;
+    construct(__func__, path, [&] {
+        switch (requestedClassId) {
+            case SPComputerSystemId:
+                fromA(path, &CMPISPHostedAccessPoint::locateProtocolEndpoint);
+                break;
+            case SPHostedAccessPointId: {
+                CMPIObjectPath* located = locateBMC(path);
+                endA.setObjectPath(located, false);
+                CMPIObjectPath* found = endA.getObjectPath();
+                endB.setObjectPath(locateProtocolEndpoint(found ? found : located));
+                walk(Side::B);
+                break;
+            }
+            case IPProtocolEndpointId:
+                // Picked out by name among the service processors enumerated.
+                endA.setObjectPath(locateBMC(path), true);
+                endB.setObjectPath(path);
+                walk(Side::A);
+                break;
+            default:
+                break;
         }
-        case IPProtocolEndpointId:
-            // Picked out by name among the service processors enumerated.
-            endA.setObjectPath(locateBMC(path), true);
-            endB.setObjectPath(path);
-            walk(Side::A);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPISPHostedAccessPoint, params.c_str());
+    });
 }
 
 CMPIObjectPath* CMPISPHostedAccessPoint::locateBMC(const CMPIObjectPath* path) {

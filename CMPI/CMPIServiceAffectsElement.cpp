@@ -19,22 +19,8 @@ const AssociationClass kAssociation = {
 CMPIServiceAffectsElement::CMPIServiceAffectsElement(const CMPIBroker* broker_, const CMPIContext* context_,
                                                      const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIServiceAffectsElement, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIServiceAffectsElement, params.c_str());
-    switch (requestedClassId) {
-        case IPConfigurationServiceId:
-            fromB(path, &CMPIServiceAffectsElement::locateIPEndptPath);
-            break;
-        case IPServiceAffectsElementId:
-            if (!setObjectPath(path)) fromA(path, &CMPIServiceAffectsElement::locateIPConfgSvce);
-            break;
-        case IPProtocolEndpointId:
-            fromA(path, &CMPIServiceAffectsElement::locateIPConfgSvce);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIServiceAffectsElement, params.c_str());
+    constructAnchored(__func__, path, IPServiceAffectsElementId, &CMPIServiceAffectsElement::locateIPEndptPath,
+                      &CMPIServiceAffectsElement::locateIPConfgSvce);
 }
 
 bool CMPIServiceAffectsElement::setObjectPath(const CMPIObjectPath* path) {

@@ -20,22 +20,21 @@ const AssociationClass kAssociation = {
 CMPIStaticElementSettingData::CMPIStaticElementSettingData(const CMPIBroker* broker_, const CMPIContext* context_,
                                                            const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIStaticElementSettingData, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIStaticElementSettingData, params.c_str());
-    switch (requestedClassId) {
-        case StaticIPAssignmentSettingDataId:
-            fromB(path, &CMPIStaticElementSettingData::locateIPEndptPath);
-            break;
-        case StaticIPElementSettingDataId:
-            walkB(&CMPIStaticElementSettingData::locateIPEndptPath);
-            break;
-        case IPProtocolEndpointId:
-            fromA(path, &CMPIStaticElementSettingData::locateStaticSettingDataPath);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIStaticElementSettingData, params.c_str());
+    construct(__func__, path, [&] {
+        switch (requestedClassId) {
+            case StaticIPAssignmentSettingDataId:
+                fromB(path, &CMPIStaticElementSettingData::locateIPEndptPath);
+                break;
+            case StaticIPElementSettingDataId:
+                walkB(&CMPIStaticElementSettingData::locateIPEndptPath);
+                break;
+            case IPProtocolEndpointId:
+                fromA(path, &CMPIStaticElementSettingData::locateStaticSettingDataPath);
+                break;
+            default:
+                break;
+        }
+    });
 }
 
 CMPIObjectPath* CMPIStaticElementSettingData::locateIPEndptPath(const CMPIObjectPath* path) {

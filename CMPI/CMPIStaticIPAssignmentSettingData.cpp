@@ -8,52 +8,27 @@ static const std::string loggerCMPIStaticIPAssignmentSettingData = "Tarvo.IPInte
 CMPIStaticIPAssignmentSettingData::CMPIStaticIPAssignmentSettingData(const CMPIBroker* broker,
                                                                      const CMPIContext* context,
                                                                      const std::string& nameSpace)
-    : CMPIAdapter(broker, context, nameSpace, loggerCMPIStaticIPAssignmentSettingData, NX_FILE) {
-    const std::string params =
-        parameterList(" _broker=", broker, " _context=", context, " _namespace=", nameSpace);
-    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
-    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
-}
+    : CMPIAdapter(broker, context, nameSpace, loggerCMPIStaticIPAssignmentSettingData, NX_FILE, __func__) {}
 
 CMPIStaticIPAssignmentSettingData::CMPIStaticIPAssignmentSettingData(const CMPIBroker* broker,
                                                                      const CMPIContext* context,
                                                                      const CMPIObjectPath* path)
-    : CMPIAdapter(broker, context, ProviderUtilities::getNamespace(path), loggerCMPIStaticIPAssignmentSettingData,
-                  NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker, " _context=", context, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
-    setObjectPath(path);
-    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    : CMPIAdapter(broker, context, path, loggerCMPIStaticIPAssignmentSettingData, NX_FILE) {
+    constructedAt(__func__, path, [&] { setObjectPath(path); });
 }
 
 void CMPIStaticIPAssignmentSettingData::setObjectPath(const CMPIObjectPath* path) {
-    const std::string params = parameterList(" objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
-    std::string instanceId;
-    if (ProviderUtilities::getKeyCount(path) != 0 && ProviderUtilities::getKeyProperty(path, "InstanceID", instanceId)) {
-        NX_VAR(loggerCMPIStaticIPAssignmentSettingData, "InstanceID", instanceId.c_str());
-        model.setFilter(StaticIPAssignmentSettingData::FilterType::ByInstanceID, instanceId);
-    }
-    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
+    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+                 {{"InstanceID", StaticIPAssignmentSettingData::FilterType::ByInstanceID}});
 }
 
 CMPIObjectPath* CMPIStaticIPAssignmentSettingData::getObjectPath() {
-    NX_ENTER(loggerCMPIStaticIPAssignmentSettingData);
-    CMPIObjectPath* path = newClassPath("KVRNX_StaticIPAssignmentSettingData");
-    std::string instanceId;
-    if (path && model.getInstanceID(instanceId)) {
-        NX_VAR(loggerCMPIStaticIPAssignmentSettingData, "instanceID", instanceId.c_str());
-        ProviderUtilities::setKeyProperty(path, "InstanceID", instanceId);
-    }
-    NX_EXIT(loggerCMPIStaticIPAssignmentSettingData);
-    return path;
+    return instanceIdPath(__func__, "KVRNX_StaticIPAssignmentSettingData",
+                          &StaticIPAssignmentSettingData::getInstanceID);
 }
 
 CMPIInstance* CMPIStaticIPAssignmentSettingData::getCMPIInstance(const char** properties) {
-    const std::string params = parameterList(" properties=", properties);
-    NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
-    CMPIInstance* instance = ProviderUtilities::createInstance(broker, getObjectPath());
-    if (instance) {
+    return instanceOf(__func__, properties, nullptr, this, [this](CMPIInstance* instance) {
         using M = StaticIPAssignmentSettingData;
         copyProperty<std::string>(instance, "InstanceID", &M::getInstanceID);
         copyProperty<std::string>(instance, "ElementName", &M::getElementName);
@@ -69,9 +44,7 @@ CMPIInstance* CMPIStaticIPAssignmentSettingData::getCMPIInstance(const char** pr
         copyProperty<unsigned short>(instance, "IPv6AddressType", &M::getIPv6AddressType);
         copyProperty<std::string>(instance, "GatewayIPv6Address", &M::getGatewayIPv6Address);
         copyProperty<std::string>(instance, "ConfigurationName", &M::getConfigurationName);
-    }
-    NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
-    return instance;
+    });
 }
 
 CMPIStatus CMPIStaticIPAssignmentSettingData::modifyInstance(const CMPIInstance* newInstance) {

@@ -20,22 +20,8 @@ const AssociationClass kAssociation = {
 CMPIStaticOrderedComponent::CMPIStaticOrderedComponent(const CMPIBroker* broker_, const CMPIContext* context_,
                                                        const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIStaticOrderedComponent, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
-    NX_ENTER_PARAMS(loggerCMPIStaticOrderedComponent, params.c_str());
-    switch (requestedClassId) {
-        case StaticIPAssignmentSettingDataId:
-            fromB(path, &CMPIStaticOrderedComponent::locateAssignmentSetting);
-            break;
-        case StaticOrderedComponentId:
-            if (!setObjectPath(path)) fromA(path, &CMPIStaticOrderedComponent::locateStaticAssignmentSetting);
-            break;
-        case IPAssignmentSettingDataId:
-            fromA(path, &CMPIStaticOrderedComponent::locateStaticAssignmentSetting);
-            break;
-        default:
-            break;
-    }
-    NX_EXIT_PARAMS(loggerCMPIStaticOrderedComponent, params.c_str());
+    constructAnchored(__func__, path, StaticOrderedComponentId, &CMPIStaticOrderedComponent::locateAssignmentSetting,
+                      &CMPIStaticOrderedComponent::locateStaticAssignmentSetting);
 }
 
 bool CMPIStaticOrderedComponent::setObjectPath(const CMPIObjectPath* path) {

@@ -28,50 +28,45 @@ void noteConfigurationName(const CMPIInstance* setting, IP_CONFIG_DATA* cfg_data
     if (configurationName.empty()) cfg_data->configNameEmpty = true;
 }
 
-std::string statusText(const CMPIStatus& status) {
-    std::string text = "Error Status: " + std::to_string(status.rc);
-    const char* message = status.msg ? CMGetCharPtr(status.msg) : nullptr;
-    if (message) text += std::string(" ") + message;
-    return text;
+// The assignment setting readers, traced as function with their parameters: a null setting or
+// record fails; otherwise read fills the record and the setting's ConfigurationName is noted.
+template <class Read>
+CMPIStatus readSetting(const char* function, const CMPIBroker* broker, const CMPIContext* context,
+                       CMPIInstance* setting, IP_CONFIG_DATA* cfg_data, Read read) {
+    const AdapterTrace tracer(loggerIPConfigurationData, NX_FILE);
+    const std::string params =
+        parameterList(" _broker=", broker, " _context=", context, " setting=", setting, " cfg_data=", cfg_data);
+    tracer(function, __LINE__, ENTERING, params);
+    const bool valid = setting && cfg_data;
+    if (valid) {
+        read(tracer, function);
+        noteConfigurationName(setting, cfg_data);
+    }
+    tracer(function, __LINE__, EXITING, params);
+    return valid ? okStatus() : failedStatus();
 }
 
 }  // namespace
 
 CMPIStatus getStaticConfigurationDetails(const CMPIBroker* broker, const CMPIContext* context,
                                          CMPIInstance* setting, IP_CONFIG_DATA* cfg_data) {
-    const std::string params =
-        parameterList(" _broker=", broker, " _context=", context, " setting=", setting, " cfg_data=", cfg_data);
-    NX_ENTER_PARAMS(loggerIPConfigurationData, params.c_str());
-    if (!setting || !cfg_data) {
-        NX_EXIT_PARAMS(loggerIPConfigurationData, params.c_str());
-        return failedStatus();
-    }
-    cfg_data->addr_origin = 3;
-    ProviderUtilities::getProperty(setting, "IPv6SubnetPrefixLength", cfg_data->ipv6_prefix);
-    ProviderUtilities::getProperty(setting, "IPv6Address", cfg_data->ipv6Address);
-    ProviderUtilities::getProperty(setting, "GatewayIPv6Address", cfg_data->ipv6Gateway);
-    ProviderUtilities::getProperty(setting, "IPv4Address", cfg_data->ipAddress);
-    ProviderUtilities::getProperty(setting, "SubnetMask", cfg_data->subnet_mask);
-    ProviderUtilities::getProperty(setting, "GatewayIPv4Address", cfg_data->ipGateway);
-    const std::string ipData = cfg_data->ipAddress + " " + cfg_data->subnet_mask + " " + cfg_data->ipGateway;
-    NX_VAR(loggerIPConfigurationData, "ipData", ipData.c_str());
-    noteConfigurationName(setting, cfg_data);
-    NX_EXIT_PARAMS(loggerIPConfigurationData, params.c_str());
-    return okStatus();
+    const auto read = [&](const AdapterTrace& tracer, const char* function) {
+        cfg_data->addr_origin = 3;
+        ProviderUtilities::getProperty(setting, "IPv6SubnetPrefixLength", cfg_data->ipv6_prefix);
+        ProviderUtilities::getProperty(setting, "IPv6Address", cfg_data->ipv6Address);
+        ProviderUtilities::getProperty(setting, "GatewayIPv6Address", cfg_data->ipv6Gateway);
+        ProviderUtilities::getProperty(setting, "IPv4Address", cfg_data->ipAddress);
+        ProviderUtilities::getProperty(setting, "SubnetMask", cfg_data->subnet_mask);
+        ProviderUtilities::getProperty(setting, "GatewayIPv4Address", cfg_data->ipGateway);
+        const std::string ipData = cfg_data->ipAddress + " " + cfg_data->subnet_mask + " " + cfg_data->ipGateway;
+        tracer.variable(function, __LINE__, "ipData", ipData.c_str());
+    };
+    return readSetting(__func__, broker, context, setting, cfg_data, read);
 }
 
 CMPIStatus getDHCPConfigurationDetails(const CMPIBroker* broker, const CMPIContext* context,
                                        CMPIInstance* setting, IP_CONFIG_DATA* cfg_data) {
-    const std::string params =
-        parameterList(" _broker=", broker, " _context=", context, " setting=", setting, " cfg_data=", cfg_data);
-    NX_ENTER_PARAMS(loggerIPConfigurationData, params.c_str());
-    if (!setting || !cfg_data) {
-        NX_EXIT_PARAMS(loggerIPConfigurationData, params.c_str());
-        return failedStatus();
-    }
-    noteConfigurationName(setting, cfg_data);
-    NX_EXIT_PARAMS(loggerIPConfigurationData, params.c_str());
-    return okStatus();
+    return readSetting(__func__, broker, context, setting, cfg_data, [](const AdapterTrace&, const char*) {});
 }
 
 CMPIStatus getDNSConfigurationDetails(const CMPIBroker* broker, const CMPIContext* context,
@@ -96,7 +91,7 @@ CMPIStatus getDNSConfigurationDetails(const CMPIBroker* broker, const CMPIContex
                                                   "KVRNX_DNSProtocolEndpoint", nullptr, nullptr, nullptr, &status);
     if (status.rc != CMPI_RC_OK || !dnsEndpoints) {
         if (status.rc == CMPI_RC_OK) status = failedStatus();
-        NX_MESSAGE(loggerIPConfigurationData, 6000, statusText(status).c_str());
+        NX_MESSAGE(loggerIPConfigurationData, 6000, errorStatusText(status).c_str());
         NX_MESSAGE(loggerIPConfigurationData, 6000, "CBAssociators Failed for the target Class");
         return leave(status);
     }

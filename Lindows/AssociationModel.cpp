@@ -52,6 +52,14 @@ void requireHostComputer(const std::string& name) {
         throw Nx::FrameworkException("Could not match 'System Name' key with 'Name' key in Computer Moniker");
 }
 
+Nx::Moniker hostedByComputerMoniker(Nx::Moniker& computer) {
+    const std::string name = requireKey(computer, "Name", "Could not find 'Name' key in Moniker");
+    requireHostComputer(name);
+    Nx::Moniker result;
+    result.addKey("SystemName", name);
+    return result;
+}
+
 std::string settingPrefixOf(const std::string& systemName) {
     return systemName == ServiceProcessorName ? "BMC" : "Computer";
 }
@@ -72,6 +80,37 @@ bool findEndpointOfSetting(IPprotocolEndpoint& endpoint, const std::string& name
         if (systemClass == wanted) return true;
     }
     return false;
+}
+
+std::vector<std::string> settingTokens(Nx::Moniker& setting, const char* malformed) {
+    std::string instanceId;
+    if (!findKey(setting, "InstanceID", instanceId))
+        throw Nx::FrameworkException("Could not find 'Name' key in Moniker");
+    std::vector<std::string> tokens;
+    Tokenize(instanceId, tokens, "%");
+    if (tokens.size() < 2) throw Nx::FrameworkException(malformed);
+    return tokens;
+}
+
+bool SettingInForce::getIsDefault(unsigned short& isDefault) {
+    isDefault = IsDefault;
+    return true;
+}
+
+bool SettingInForce::getIsCurrent(unsigned short& isCurrent) {
+    isCurrent = IsCurrent;
+    return true;
+}
+
+void SettingInForce::setIsDefault(unsigned short isDefault) { IsDefault = isDefault; }
+void SettingInForce::setIsCurrent(unsigned short isCurrent) { IsCurrent = isCurrent; }
+
+void SettingInForce::resolveAgainst(IPprotocolEndpoint& endpoint, const std::string& kind) {
+    unsigned short origin = 0;
+    endpoint.getAddressOrigin(origin);
+    const bool inForce = (origin == 4 && kind == "dhcp") || (origin == 3 && kind == "static");
+    setIsDefault(inForce ? 1 : 2);
+    setIsCurrent(inForce ? 1 : 2);
 }
 
 void addEndpointKeys(Nx::Moniker& result, IPprotocolEndpoint& endpoint) {

@@ -11,10 +11,7 @@ using Nx::NodeLexicon::Properties;
 
 const std::string& IPAssignmentSettingData::logger() { return loggerIPAssignmentSettingData; }
 
-IPAssignmentSettingData::IPAssignmentSettingData() : assignmentKind(1), isCfg(false) {
-    NX_ENTER(loggerIPAssignmentSettingData);
-    NX_EXIT(loggerIPAssignmentSettingData);
-}
+IPAssignmentSettingData::IPAssignmentSettingData() : Base(NX_SITE), assignmentKind(1), isCfg(false) {}
 
 void IPAssignmentSettingData::setFilter(FilterType filterType, const std::string& reference, bool cfg) {
     isCfg = cfg;
@@ -60,17 +57,12 @@ bool IPAssignmentSettingData::getInstanceId(std::string& instanceId) {
 }
 
 bool IPAssignmentSettingData::getElementName(std::string& elementName) {
-    NX_ENTER(loggerIPAssignmentSettingData);
-    instrumentation.getProperty(Properties::ElementName, elementName);
-    NX_EXIT(loggerIPAssignmentSettingData);
+    readProperty(NX_SITE, Properties::ElementName, elementName);
     return true;
 }
 
 bool IPAssignmentSettingData::getAddressOrigin(unsigned short& addressOrigin) {
-    NX_ENTER(loggerIPAssignmentSettingData);
-    addressOrigin = 2;
-    NX_EXIT(loggerIPAssignmentSettingData);
-    return true;
+    return fixed(NX_SITE, addressOrigin, 2);
 }
 
 bool IPAssignmentSettingData::getConfigurationName(std::string& configurationName) {

@@ -7,10 +7,7 @@ static const std::string loggerIPConfigurationService = "Tarvo.IPInterfaceProvid
 
 const std::string& IPConfigurationService::logger() { return loggerIPConfigurationService; }
 
-IPConfigurationService::IPConfigurationService() : instanceCount(0) {
-    NX_ENTER(loggerIPConfigurationService);
-    NX_EXIT(loggerIPConfigurationService);
-}
+IPConfigurationService::IPConfigurationService() : Base(NX_SITE), instanceCount(0) {}
 
 IPConfigurationService& IPConfigurationService::operator++() {
     ++instanceCount;
@@ -34,40 +31,24 @@ bool IPConfigurationService::filterHolds(const Filter& filter) {
 }
 
 bool IPConfigurationService::getCreationClassName(std::string& creationClassName) {
-    NX_ENTER(loggerIPConfigurationService);
-    creationClassName = "KVRNX_IPConfigurationService";
-    NX_EXIT(loggerIPConfigurationService);
-    return true;
+    return fixed(NX_SITE, creationClassName, "KVRNX_IPConfigurationService");
 }
 
 bool IPConfigurationService::getName(std::string& name) {
-    NX_ENTER(loggerIPConfigurationService);
-    name = "IPConfigService";
-    NX_EXIT(loggerIPConfigurationService);
-    return true;
+    return fixed(NX_SITE, name, "IPConfigService");
 }
 
 bool IPConfigurationService::getElementName(std::string& elementName) {
-    NX_ENTER(loggerIPConfigurationService);
-    elementName = "IPConfigService";
-    NX_EXIT(loggerIPConfigurationService);
-    return true;
+    return fixed(NX_SITE, elementName, "IPConfigService");
 }
 
 // The service always belongs to the host, never to the service processor.
 bool IPConfigurationService::getSystemCreationClassName(std::string& systemCreationClassName) {
-    NX_ENTER(loggerIPConfigurationService);
-    systemCreationClassName = "KVRNX_ComputerSystem";
-    NX_EXIT(loggerIPConfigurationService);
-    return true;
+    return fixed(NX_SITE, systemCreationClassName, "KVRNX_ComputerSystem");
 }
 
 bool IPConfigurationService::getSystemName(std::string& systemName) {
-    NX_ENTER(loggerIPConfigurationService);
-    bool found = localHostName(systemName);
-    if (!found) NX_MESSAGE(loggerIPConfigurationService, 6000, "gethostname Failed");
-    NX_EXIT(loggerIPConfigurationService);
-    return found;
+    return Base::systemName(NX_SITE, false, systemName);
 }
 
 }  // namespace IPInterfaceProvider

@@ -11,18 +11,9 @@ namespace IPInterfaceProvider {
 
 static const std::string loggerIPElementSettingData = "Tarvo.IPInterfaceProvider";
 
-// 0 (Unknown) until a setting has been resolved against its endpoint.
-IPElementSettingData::IPElementSettingData() : IsDefault(0), IsCurrent(0) {}
-IPElementSettingData::~IPElementSettingData() = default;
-
 Nx::Moniker IPElementSettingData::getManagedElementMoniker(Nx::Moniker& setting) {
     NX_ENTER(loggerIPElementSettingData);
-    std::string instanceId;
-    if (!findKey(setting, "InstanceID", instanceId))
-        throw Nx::FrameworkException("Could not find 'Name' key in Moniker");
-    std::vector<std::string> tokens;
-    Tokenize(instanceId, tokens, "%");
-    if (tokens.size() < 2) throw Nx::FrameworkException("Instance ID Property value is not correct");
+    const std::vector<std::string> tokens = settingTokens(setting, "Instance ID Property value is not correct");
 
     // The setting model writes prefix%interface%kind; an ID without the prefix reads as
     // interface%kind and may name an interface of either system.
@@ -35,12 +26,7 @@ Nx::Moniker IPElementSettingData::getManagedElementMoniker(Nx::Moniker& setting)
 
     Nx::Moniker result;
     addEndpointKeys(result, endpoint);
-    unsigned short origin = 0;
-    endpoint.getAddressOrigin(origin);
-    // IsDefault and IsCurrent always move together.
-    const bool inForce = (origin == 4 && kind == "dhcp") || (origin == 3 && kind == "static");
-    setIsDefault(inForce ? 1 : 2);
-    setIsCurrent(inForce ? 1 : 2);
+    resolveAgainst(endpoint, kind);
     NX_EXIT(loggerIPElementSettingData);
     return result;
 }
@@ -71,23 +57,10 @@ Nx::Moniker IPElementSettingData::getIPSettingDataMoniker(Nx::Moniker& endpoint)
     return result;
 }
 
-bool IPElementSettingData::getIsDefault(unsigned short& isDefault) {
-    isDefault = IsDefault;
-    return true;
-}
-
-bool IPElementSettingData::getIsCurrent(unsigned short& isCurrent) {
-    isCurrent = IsCurrent;
-    return true;
-}
-
 bool IPElementSettingData::getIsNext(unsigned short& isNext) {
     isNext = 2;
     return true;
 }
-
-void IPElementSettingData::setIsDefault(unsigned short isDefault) { IsDefault = isDefault; }
-void IPElementSettingData::setIsCurrent(unsigned short isCurrent) { IsCurrent = isCurrent; }
 
 }  // namespace IPInterfaceProvider
 }  // namespace Nx

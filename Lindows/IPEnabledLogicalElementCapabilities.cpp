@@ -9,10 +9,7 @@ using Nx::NodeLexicon::Properties;
 
 const std::string& IPEnabledLogicalElementCapabilities::logger() { return loggerIPEnabledLogicalElementCapabilities; }
 
-IPEnabledLogicalElementCapabilities::IPEnabledLogicalElementCapabilities() {
-    NX_ENTER(loggerIPEnabledLogicalElementCapabilities);
-    NX_EXIT(loggerIPEnabledLogicalElementCapabilities);
-}
+IPEnabledLogicalElementCapabilities::IPEnabledLogicalElementCapabilities() : Base(NX_SITE) {}
 
 bool IPEnabledLogicalElementCapabilities::filterHolds(const Filter& filter) {
     if (filter.filterType != ByInstanceID) return true;
@@ -23,17 +20,11 @@ bool IPEnabledLogicalElementCapabilities::filterHolds(const Filter& filter) {
 }
 
 bool IPEnabledLogicalElementCapabilities::getInstanceID(std::string& instanceID) {
-    NX_ENTER(loggerIPEnabledLogicalElementCapabilities);
-    bool found = instrumentation.getProperty(Properties::ElementName, instanceID);
-    NX_EXIT(loggerIPEnabledLogicalElementCapabilities);
-    return found;
+    return readProperty(NX_SITE, Properties::ElementName, instanceID);
 }
 
 bool IPEnabledLogicalElementCapabilities::getElementName(std::string& elementName) {
-    NX_ENTER(loggerIPEnabledLogicalElementCapabilities);
-    bool found = instrumentation.getProperty(Properties::ElementName, elementName);
-    NX_EXIT(loggerIPEnabledLogicalElementCapabilities);
-    return found;
+    return readProperty(NX_SITE, Properties::ElementName, elementName);
 }
 
 bool IPEnabledLogicalElementCapabilities::getElementNameEditSupported(bool& editSupported) {

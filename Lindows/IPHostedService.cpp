@@ -17,10 +17,7 @@ Nx::Moniker IPHostedService::getComputerSystemMoniker(Nx::Moniker& service) {
 
 Nx::Moniker IPHostedService::getIPConfigurationServiceMoniker(Nx::Moniker& computer) {
     NX_ENTER(loggerIPHostedService);
-    const std::string name = requireKey(computer, "Name", "Could not find 'Name' key in Moniker");
-    requireHostComputer(name);
-    Nx::Moniker result;
-    result.addKey("SystemName", name);
+    Nx::Moniker result = hostedByComputerMoniker(computer);
     NX_EXIT(loggerIPHostedService);
     return result;
 }

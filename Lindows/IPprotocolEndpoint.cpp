@@ -9,10 +9,7 @@ using Nx::NodeLexicon::Properties;
 
 const std::string& IPprotocolEndpoint::logger() { return loggerIPprotocolEndpoint; }
 
-IPprotocolEndpoint::IPprotocolEndpoint() {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    NX_EXIT(loggerIPprotocolEndpoint);
-}
+IPprotocolEndpoint::IPprotocolEndpoint() : Base(NX_SITE) {}
 
 bool IPprotocolEndpoint::filterHolds(const Filter& filter) {
     std::string value;
@@ -31,113 +28,62 @@ bool IPprotocolEndpoint::onServiceProcessor() const {
 }
 
 bool IPprotocolEndpoint::getName(std::string& name) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    instrumentation.getProperty(Properties::ElementName, name);
-    NX_EXIT(loggerIPprotocolEndpoint);
+    readProperty(NX_SITE, Properties::ElementName, name);
     return true;
 }
 
 bool IPprotocolEndpoint::getElementName(std::string& elementName) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    instrumentation.getProperty(Properties::ElementName, elementName);
-    NX_EXIT(loggerIPprotocolEndpoint);
+    readProperty(NX_SITE, Properties::ElementName, elementName);
     return true;
 }
 
 bool IPprotocolEndpoint::getCreationClassName(std::string& creationClassName) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    creationClassName = "KVRNX_IPProtocolEndpoint";
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return true;
+    return fixed(NX_SITE, creationClassName, "KVRNX_IPProtocolEndpoint");
 }
 
 bool IPprotocolEndpoint::getNameFormat(std::string& nameFormat) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    nameFormat = "NIC Name";
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return true;
+    return fixed(NX_SITE, nameFormat, "NIC Name");
 }
 
 bool IPprotocolEndpoint::getDescription(std::string& description) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    description = instrumentation.getNodeDescription();
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return true;
+    return fixed(NX_SITE, description, instrumentation.getNodeDescription());
 }
 
 bool IPprotocolEndpoint::getSystemCreationClassName(std::string& systemCreationClassName) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    systemCreationClassName = onServiceProcessor() ? "KVRNX_SPComputerSystem" : "KVRNX_ComputerSystem";
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return true;
+    return fixed(NX_SITE, systemCreationClassName,
+                 onServiceProcessor() ? "KVRNX_SPComputerSystem" : "KVRNX_ComputerSystem");
 }
 
 bool IPprotocolEndpoint::getSystemName(std::string& systemName) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    bool found = true;
-    if (onServiceProcessor()) {
-        systemName = "BMC:-1";
-    } else if (!localHostName(systemName)) {
-        NX_MESSAGE(loggerIPprotocolEndpoint, 6000, "gethostname Failed");
-        found = false;
-    }
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return found;
+    return Base::systemName(NX_SITE, onServiceProcessor(), systemName);
 }
 
 bool IPprotocolEndpoint::getIPv4Address(std::string& address) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    bool found = instrumentation.getProperty(Properties::IPv4Address, address);
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return found;
+    return readProperty(NX_SITE, Properties::IPv4Address, address);
 }
 
 bool IPprotocolEndpoint::getSubnetMask(std::string& subnetMask) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    bool found = instrumentation.getProperty(Properties::SubnetMask, subnetMask);
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return found;
+    return readProperty(NX_SITE, Properties::SubnetMask, subnetMask);
 }
 
 bool IPprotocolEndpoint::getIPv6Address(std::string& address) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    bool found = instrumentation.getProperty(Properties::IPv6Address, address);
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return found;
+    return readProperty(NX_SITE, Properties::IPv6Address, address);
 }
 
 bool IPprotocolEndpoint::getIPv6AddressType(unsigned short& addressType) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    unsigned int code = 0;
-    bool found = instrumentation.getProperty(Properties::IPv6AddressType, code);
-    if (found) addressType = static_cast<unsigned short>(code);
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return found;
+    return readProperty(NX_SITE, Properties::IPv6AddressType, addressType);
 }
 
 bool IPprotocolEndpoint::getProtocolIFType(unsigned short& protocolIFType) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    unsigned int code = 0;
-    bool found = instrumentation.getProperty(Properties::ProtocolIFType, code);
-    if (found) protocolIFType = static_cast<unsigned short>(code);
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return found;
+    return readProperty(NX_SITE, Properties::ProtocolIFType, protocolIFType);
 }
 
 bool IPprotocolEndpoint::getPrefixLength(unsigned int& prefixLength) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    bool found = instrumentation.getProperty(Properties::PrefixLength, prefixLength);
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return found;
+    return readProperty(NX_SITE, Properties::PrefixLength, prefixLength);
 }
 
 bool IPprotocolEndpoint::getIPv6SubnetPrefixLength(unsigned short& prefixLength) {
-    NX_ENTER(loggerIPprotocolEndpoint);
-    unsigned int length = 0;
-    bool found = instrumentation.getProperty(Properties::PrefixLength, length);
-    if (found) prefixLength = static_cast<unsigned short>(length);
-    NX_EXIT(loggerIPprotocolEndpoint);
-    return found;
+    return readProperty(NX_SITE, Properties::PrefixLength, prefixLength);
 }
 
 bool IPprotocolEndpoint::getIPVersionSupport(unsigned short& versionSupport) {

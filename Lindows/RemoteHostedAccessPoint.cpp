@@ -17,10 +17,7 @@ Nx::Moniker RemoteHostedAccessPoint::getSystemMoniker(Nx::Moniker& accessPoint) 
 
 Nx::Moniker RemoteHostedAccessPoint::getRemoteSAPMoniker(Nx::Moniker& computer) {
     NX_ENTER(loggerRemoteHostedAccessPoint);
-    const std::string name = requireKey(computer, "Name", "Could not find 'Name' key in Moniker");
-    requireHostComputer(name);
-    Nx::Moniker result;
-    result.addKey("SystemName", name);
+    Nx::Moniker result = hostedByComputerMoniker(computer);
     NX_EXIT(loggerRemoteHostedAccessPoint);
     return result;
 }

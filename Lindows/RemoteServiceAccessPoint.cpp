@@ -125,10 +125,7 @@ bool RemoteServiceAccessPoint::filterHolds(const Filter& filter) {
 }
 
 bool RemoteServiceAccessPoint::getCreationClassName(std::string& creationClassName) {
-    NX_ENTER(loggerRemoteServiceAccessPoint);
-    creationClassName = "KVRNX_IPRemoteServiceAccessPoint";
-    NX_EXIT(loggerRemoteServiceAccessPoint);
-    return true;
+    return fixed(NX_SITE, creationClassName, "KVRNX_IPRemoteServiceAccessPoint");
 }
 
 bool RemoteServiceAccessPoint::getName(std::string& name) {
@@ -141,32 +138,17 @@ bool RemoteServiceAccessPoint::getName(std::string& name) {
 }
 
 bool RemoteServiceAccessPoint::getElementName(std::string& elementName) {
-    NX_ENTER(loggerRemoteServiceAccessPoint);
-    bool found = instrumentation.getProperty(Properties::ElementName, elementName);
-    NX_EXIT(loggerRemoteServiceAccessPoint);
-    return found;
+    return readProperty(NX_SITE, Properties::ElementName, elementName);
 }
 
 // The service processor is recognised by its own node here, not by the endpoint's description.
 bool RemoteServiceAccessPoint::getSystemCreationClassName(std::string& systemCreationClassName) {
-    NX_ENTER(loggerRemoteServiceAccessPoint);
-    systemCreationClassName =
-        isUnderServiceProcessor(instrumentation) ? "KVRNX_SPComputerSystem" : "KVRNX_ComputerSystem";
-    NX_EXIT(loggerRemoteServiceAccessPoint);
-    return true;
+    return fixed(NX_SITE, systemCreationClassName,
+                 isUnderServiceProcessor(instrumentation) ? "KVRNX_SPComputerSystem" : "KVRNX_ComputerSystem");
 }
 
 bool RemoteServiceAccessPoint::getSystemName(std::string& systemName) {
-    NX_ENTER(loggerRemoteServiceAccessPoint);
-    bool found = true;
-    if (isUnderServiceProcessor(instrumentation)) {
-        systemName = "BMC:-1";
-    } else if (!localHostName(systemName)) {
-        NX_MESSAGE(loggerRemoteServiceAccessPoint, 6000, "gethostname Failed");
-        found = false;
-    }
-    NX_EXIT(loggerRemoteServiceAccessPoint);
-    return found;
+    return Base::systemName(NX_SITE, isUnderServiceProcessor(instrumentation), systemName);
 }
 
 bool RemoteServiceAccessPoint::getAccessInfo(std::string& accessInfo) {
@@ -177,17 +159,11 @@ bool RemoteServiceAccessPoint::getAccessInfo(std::string& accessInfo) {
 }
 
 bool RemoteServiceAccessPoint::getInfoFormat(unsigned short& infoFormat) {
-    NX_ENTER(loggerRemoteServiceAccessPoint);
-    infoFormat = presentsIPv6() ? 4 : 3;  // IPv6 address : IPv4 address
-    NX_EXIT(loggerRemoteServiceAccessPoint);
-    return true;
+    return fixed(NX_SITE, infoFormat, presentsIPv6() ? 4 : 3);  // IPv6 address : IPv4 address
 }
 
 bool RemoteServiceAccessPoint::getAccessContext(unsigned short& accessContext) {
-    NX_ENTER(loggerRemoteServiceAccessPoint);
-    accessContext = 2;  // default gateway
-    NX_EXIT(loggerRemoteServiceAccessPoint);
-    return true;
+    return fixed(NX_SITE, accessContext, 2);  // default gateway
 }
 
 bool RemoteServiceAccessPoint::getOtherAccessContext(std::string& /*otherAccessContext*/) {

@@ -11,10 +11,7 @@ using Nx::NodeLexicon::Properties;
 
 const std::string& StaticIPAssignmentSettingData::logger() { return loggerStaticIPAssignmentSettingData; }
 
-StaticIPAssignmentSettingData::StaticIPAssignmentSettingData() {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-}
+StaticIPAssignmentSettingData::StaticIPAssignmentSettingData() : Base(NX_SITE) {}
 
 bool StaticIPAssignmentSettingData::filterHolds(const Filter& filter) {
     if (filter.filterType != ByInstanceID) return true;
@@ -30,15 +27,21 @@ bool StaticIPAssignmentSettingData::filePath(std::string& path) {
     return true;
 }
 
-void StaticIPAssignmentSettingData::readSetting(const char* key, Properties fallback, std::string& value) {
-    std::string path;
-    if (filePath(path) && readConfigurationValue(path, key, value)) return;
-    instrumentation.getProperty(fallback, value);
+bool StaticIPAssignmentSettingData::readSetting(const Site& at, const char* key, Properties fallback,
+                                                std::string& value) {
+    return traced(at, [&] {
+        std::string path;
+        if (!filePath(path) || !readConfigurationValue(path, key, value)) instrumentation.getProperty(fallback, value);
+        return true;
+    });
 }
 
-void StaticIPAssignmentSettingData::writeSetting(const char* key, const std::string& value) {
-    std::string path;
-    if (filePath(path)) modifyValue(path, key, value);
+bool StaticIPAssignmentSettingData::writeSetting(const Site& at, const char* key, const std::string& value) {
+    return traced(at, [&] {
+        std::string path;
+        if (filePath(path)) modifyValue(path, key, value);
+        return true;
+    });
 }
 
 bool StaticIPAssignmentSettingData::getInstanceID(std::string& instanceID) {
@@ -51,17 +54,12 @@ bool StaticIPAssignmentSettingData::getInstanceID(std::string& instanceID) {
 }
 
 bool StaticIPAssignmentSettingData::getElementName(std::string& elementName) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    instrumentation.getProperty(Properties::ElementName, elementName);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
+    readProperty(NX_SITE, Properties::ElementName, elementName);
     return true;
 }
 
 bool StaticIPAssignmentSettingData::getAddressOrigin(unsigned short& addressOrigin) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    addressOrigin = 3;
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return fixed(NX_SITE, addressOrigin, 3);
 }
 
 // These codes differ from the ones the endpoint maps; the setting reports its own.
@@ -75,56 +73,33 @@ bool StaticIPAssignmentSettingData::getAddressType(unsigned short& addressType) 
 }
 
 bool StaticIPAssignmentSettingData::getIPv6AddressType(unsigned short& addressType) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    unsigned int code = 0;
-    bool found = instrumentation.getProperty(Properties::IPv6AddressType, code);
-    if (found) addressType = static_cast<unsigned short>(code);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return found;
+    return readProperty(NX_SITE, Properties::IPv6AddressType, addressType);
 }
 
 bool StaticIPAssignmentSettingData::getPrefixLength(unsigned int& prefixLength) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    bool found = instrumentation.getProperty(Properties::PrefixLength, prefixLength);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return found;
+    return readProperty(NX_SITE, Properties::PrefixLength, prefixLength);
 }
 
 // The address is read under "IPV4ADDR" but written under "IPv4ADDR": the two spellings are both
 // in use and must stay as they are.
 bool StaticIPAssignmentSettingData::getIPv4Address(std::string& address) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    readSetting("IPV4ADDR", Properties::IPv4Address, address);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return readSetting(NX_SITE, "IPV4ADDR", Properties::IPv4Address, address);
 }
 
 bool StaticIPAssignmentSettingData::getSubnetMask(std::string& subnetMask) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    readSetting("NETMASK", Properties::SubnetMask, subnetMask);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return readSetting(NX_SITE, "NETMASK", Properties::SubnetMask, subnetMask);
 }
 
 bool StaticIPAssignmentSettingData::getGatewayIPv4Address(std::string& gateway) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    readSetting("GATEWAY", Properties::IPv4Gateway, gateway);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return readSetting(NX_SITE, "GATEWAY", Properties::IPv4Gateway, gateway);
 }
 
 bool StaticIPAssignmentSettingData::getIPv6Address(std::string& address) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    readSetting("IPV6ADDR", Properties::IPv6Address, address);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return readSetting(NX_SITE, "IPV6ADDR", Properties::IPv6Address, address);
 }
 
 bool StaticIPAssignmentSettingData::getGatewayIPv6Address(std::string& gateway) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    readSetting("IPV6GATEWAY", Properties::IPv6Gateway, gateway);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return readSetting(NX_SITE, "IPV6GATEWAY", Properties::IPv6Gateway, gateway);
 }
 
 bool StaticIPAssignmentSettingData::getIPv6SubnetPrefixLength(unsigned short& prefixLength) {
@@ -157,59 +132,35 @@ bool StaticIPAssignmentSettingData::getConfigurationName(std::string& configurat
 }
 
 bool StaticIPAssignmentSettingData::setConfigurationName(const std::string& configurationName) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    writeSetting("CONFIG_NAME", configurationName);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return writeSetting(NX_SITE, "CONFIG_NAME", configurationName);
 }
 
 bool StaticIPAssignmentSettingData::setIPv4Address(const std::string& address) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    writeSetting("IPv4ADDR", address);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return writeSetting(NX_SITE, "IPv4ADDR", address);
 }
 
 bool StaticIPAssignmentSettingData::setSubnetMask(const std::string& subnetMask) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    writeSetting("NETMASK", subnetMask);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return writeSetting(NX_SITE, "NETMASK", subnetMask);
 }
 
 bool StaticIPAssignmentSettingData::setGatewayIPv4Address(const std::string& gateway) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    writeSetting("GATEWAY", gateway);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return writeSetting(NX_SITE, "GATEWAY", gateway);
 }
 
 bool StaticIPAssignmentSettingData::setIPv6Address(const std::string& address) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    writeSetting("IPV6ADDR", address);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return writeSetting(NX_SITE, "IPV6ADDR", address);
 }
 
 bool StaticIPAssignmentSettingData::setGatewayIPv6Address(const std::string& gateway) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    writeSetting("IPV6GATEWAY", gateway);
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return writeSetting(NX_SITE, "IPV6GATEWAY", gateway);
 }
 
 bool StaticIPAssignmentSettingData::setIPv6SubnetPrefixLength(unsigned short prefixLength) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    writeSetting("PREFIX", std::to_string(prefixLength));
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return writeSetting(NX_SITE, "PREFIX", std::to_string(prefixLength));
 }
 
 bool StaticIPAssignmentSettingData::setAddressOrigin(unsigned short /*addressOrigin*/) {
-    NX_ENTER(loggerStaticIPAssignmentSettingData);
-    writeSetting("BOOTPROTO", "static");
-    NX_EXIT(loggerStaticIPAssignmentSettingData);
-    return true;
+    return writeSetting(NX_SITE, "BOOTPROTO", "static");
 }
 
 }  // namespace IPInterfaceProvider

@@ -11,20 +11,12 @@ namespace IPInterfaceProvider {
 
 static const std::string loggerStaticIPElementSettingData = "Tarvo.IPInterfaceProvider";
 
-StaticIPElementSettingData::StaticIPElementSettingData() : IsDefault(0), IsCurrent(0) {}
-StaticIPElementSettingData::~StaticIPElementSettingData() = default;
-
 // A static setting is named "prefix%interface" (Computer%eth0, BMC%usb0), so its tokens are the
 // system prefix and the interface name, split at "%". Interface names may themselves hold ":"
 // (aliases such as eth0:1) and "_", so those are not separators here.
 Nx::Moniker StaticIPElementSettingData::getManagedElementMoniker(Nx::Moniker& setting) {
     NX_ENTER(loggerStaticIPElementSettingData);
-    std::string instanceId;
-    if (!findKey(setting, "InstanceID", instanceId))
-        throw Nx::FrameworkException("Could not find 'Name' key in Moniker");
-    std::vector<std::string> instance_tokens;
-    Tokenize(instanceId, instance_tokens, "%");
-    if (instance_tokens.size() < 2) throw Nx::FrameworkException("Could not find 'InstanceID tokens");
+    const std::vector<std::string> instance_tokens = settingTokens(setting, "Could not find 'InstanceID tokens");
     NX_VAR(loggerStaticIPElementSettingData, "instance_tokens[0]", instance_tokens[0].c_str());
     NX_VAR(loggerStaticIPElementSettingData, "instance_tokens[1]", instance_tokens[1].c_str());
 
@@ -37,11 +29,7 @@ Nx::Moniker StaticIPElementSettingData::getManagedElementMoniker(Nx::Moniker& se
     endpoint.getName(name);
     result.addKey("Name", name);
 
-    unsigned short origin = 0;
-    endpoint.getAddressOrigin(origin);
-    const bool inForce = origin == 3;
-    setIsDefault(inForce ? 1 : 2);
-    setIsCurrent(inForce ? 1 : 2);
+    resolveAgainst(endpoint, "static");
     NX_EXIT(loggerStaticIPElementSettingData);
     return result;
 }
@@ -73,19 +61,6 @@ Nx::Moniker StaticIPElementSettingData::getStaticIPSettingDataMoniker(Nx::Monike
     NX_EXIT(loggerStaticIPElementSettingData);
     return result;
 }
-
-bool StaticIPElementSettingData::getIsDefault(unsigned short& isDefault) {
-    isDefault = IsDefault;
-    return true;
-}
-
-bool StaticIPElementSettingData::getIsCurrent(unsigned short& isCurrent) {
-    isCurrent = IsCurrent;
-    return true;
-}
-
-void StaticIPElementSettingData::setIsDefault(unsigned short isDefault) { IsDefault = isDefault; }
-void StaticIPElementSettingData::setIsCurrent(unsigned short isCurrent) { IsCurrent = isCurrent; }
 
 }  // namespace IPInterfaceProvider
 }  // namespace Nx

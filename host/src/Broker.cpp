@@ -14,20 +14,6 @@ namespace detail {
 
 namespace {
 
-template <class T>
-T zeroed() {
-    T t;
-    std::memset(&t, 0, sizeof t);
-    return t;
-}
-
-CMPIStatus rcStatus(CMPIrc rc) {
-    CMPIStatus s;
-    s.rc = rc;
-    s.msg = nullptr;
-    return s;
-}
-
 std::vector<std::string> propertyList(const char** props) {
     std::vector<std::string> out;
     if (props)

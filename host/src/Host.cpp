@@ -149,24 +149,13 @@ Host::Impl::~Impl() {
                 } catch (...) {
                     continue;
                 }
+                auto cleanup = [&](auto* mi) {
+                    return mi->ft && mi->ft->cleanup ? mi->ft->cleanup(mi, ctx, 1) : okStatus();
+                };
                 CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-                    switch (k) {
-                    case 0: {
-                        auto* mi = static_cast<CMPIInstanceMI*>(p->mi[k]);
-                        if (mi->ft && mi->ft->cleanup) return mi->ft->cleanup(mi, ctx, 1);
-                        break;
-                    }
-                    case 1: {
-                        auto* mi = static_cast<CMPIAssociationMI*>(p->mi[k]);
-                        if (mi->ft && mi->ft->cleanup) return mi->ft->cleanup(mi, ctx, 1);
-                        break;
-                    }
-                    default: {
-                        auto* mi = static_cast<CMPIMethodMI*>(p->mi[k]);
-                        if (mi->ft && mi->ft->cleanup) return mi->ft->cleanup(mi, ctx, 1);
-                    }
-                    }
-                    return okStatus();
+                    if (k == 0) return cleanup(static_cast<CMPIInstanceMI*>(p->mi[k]));
+                    if (k == 1) return cleanup(static_cast<CMPIAssociationMI*>(p->mi[k]));
+                    return cleanup(static_cast<CMPIMethodMI*>(p->mi[k]));
                 });
                 if (st.rc == CMPI_RC_DO_NOT_UNLOAD || st.rc == CMPI_RC_NEVER_UNLOAD) keepLoaded = true;
             }
@@ -348,6 +337,65 @@ void Host::Impl::finish(Result& r, Collector& c, const CMPIStatus& st) {
     }
 }
 
+// One call into a provider: the context, result and object path it is handed, and what it
+// hands back.
+struct Host::Impl::Call {
+    Call(Impl* h, const ObjectPath& path, const NamedValues* entries) : host(h) {
+        col.nameSpace = h->nameSpaceOf(path);
+        ctx = h->newContext(col.nameSpace, entries);
+        res = make<ResultObj>(h, &col);
+        ObjectPath full = path;
+        full.nameSpace = col.nameSpace;
+        cop = make<PathObj>(h, full);
+    }
+    // inst as modify and create hand it to the provider: with its path set to the request's.
+    InstanceObj* instance(const Instance& inst) {
+        Instance copy = inst;
+        copy.path = cop->path;
+        return make<InstanceObj>(host, std::move(copy));
+    }
+    // Calls the MI function fn (CMPI_RC_ERR_NOT_SUPPORTED when the provider lacks it, with
+    // noTable as the message when it has no function table) and adds its results to result.
+    template <class MI, class Fn, class... A>
+    void run(Result& result, MI* mi, Fn fn, const char* noTable, A... args) {
+        CMPIStatus st = callProvider(host, [&]() -> CMPIStatus {
+            if (!mi->ft) return status(host, CMPI_RC_ERR_NOT_SUPPORTED, noTable);
+            if (!(mi->ft->*fn)) return status(host, CMPI_RC_ERR_NOT_SUPPORTED, "");
+            return (mi->ft->*fn)(mi, ctx, res, cop, args...);
+        });
+        res->sink = nullptr;
+        host->finish(result, col, st);
+    }
+
+    Impl* host;
+    Collector col;
+    CMPIContext* ctx;
+    ResultObj* res;
+    PathObj* cop;
+};
+
+template <class MI>
+MI* Host::Impl::miOf(Provider& p, Kind kind, Result& result) {
+    std::string error;
+    auto* mi = static_cast<MI*>(miFor(p, kind, error));
+    if (!mi) result = failure(CMPI_RC_ERR_FAILED, error);
+    return mi;
+}
+
+template <class MI>
+MI* Host::Impl::serving(const ObjectPath& path, Kind kind, CMPIrc none, Result& result) {
+    std::string ns = nameSpaceOf(path);
+    if (!repo.exists(path.className)) {
+        result = failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
+        return nullptr;
+    }
+    if (const Registration* reg = registrationFor(ns, path.className, kind))
+        return miOf<MI>(*providerOf(*reg), kind, result);
+    result = failure(none, std::string("no ") + (kind == Kind::Method ? "method" : "instance") + " provider for " +
+                               path.className + " in " + ns);
+    return nullptr;
+}
+
 Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std::vector<std::string>* props,
                              const NamedValues* ctx) {
     std::string ns = nameSpaceOf(classPath);
@@ -361,161 +409,64 @@ Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std:
     }
     Result result;
     for (const Registration* reg : targets) {
-        std::string error;
-        auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
-        if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
-        Collector col;
-        col.nameSpace = ns;
-        CMPIContext* cctx = newContext(ns, ctx);
-        ResultObj* res = make<ResultObj>(this, &col);
-        PathObj* cop = make<PathObj>(this, ObjectPath(ns, repo.find(reg->className)->name));
+        auto* mi = miOf<CMPIInstanceMI>(*providerOf(*reg), Kind::Instance, result);
+        if (!mi) return result;
+        Call call(this, ObjectPath(ns, repo.find(reg->className)->name), ctx);
         CharList pl(props);
-        CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-            if (!mi->ft) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "provider has no function table");
-            if (names) {
-                if (!mi->ft->enumerateInstanceNames) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-                return mi->ft->enumerateInstanceNames(mi, cctx, res, cop);
-            }
-            if (!mi->ft->enumerateInstances) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-            return mi->ft->enumerateInstances(mi, cctx, res, cop, pl.get());
-        });
-        res->sink = nullptr;
-        finish(result, col, st);
+        const char* noTable = "provider has no function table";
+        if (names)
+            call.run(result, mi, &CMPIInstanceMIFT::enumerateInstanceNames, noTable);
+        else
+            call.run(result, mi, &CMPIInstanceMIFT::enumerateInstances, noTable, pl.get());
         if (!result.ok()) break;
     }
     return result;
 }
 
 Result Host::Impl::get(const ObjectPath& path, const std::vector<std::string>* props, const NamedValues* ctx) {
-    std::string ns = nameSpaceOf(path);
-    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
-    const Registration* reg = registrationFor(ns, path.className, Kind::Instance);
-    if (!reg) return failure(CMPI_RC_ERR_NOT_FOUND, "no instance provider for " + path.className + " in " + ns);
-    std::string error;
-    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
-    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
-    Collector col;
-    col.nameSpace = ns;
-    CMPIContext* cctx = newContext(ns, ctx);
-    ResultObj* res = make<ResultObj>(this, &col);
-    ObjectPath full = path;
-    full.nameSpace = ns;
-    PathObj* cop = make<PathObj>(this, full);
-    CharList pl(props);
-    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-        if (!mi->ft || !mi->ft->getInstance) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-        return mi->ft->getInstance(mi, cctx, res, cop, pl.get());
-    });
-    res->sink = nullptr;
     Result result;
-    finish(result, col, st);
+    if (auto* mi = serving<CMPIInstanceMI>(path, Kind::Instance, CMPI_RC_ERR_NOT_FOUND, result)) {
+        Call call(this, path, ctx);
+        CharList pl(props);
+        call.run(result, mi, &CMPIInstanceMIFT::getInstance, "", pl.get());
+    }
     return result;
 }
 
 Result Host::Impl::modify(const ObjectPath& path, const Instance& inst, const std::vector<std::string>* props,
                           const NamedValues* ctx) {
-    std::string ns = nameSpaceOf(path);
-    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
-    const Registration* reg = registrationFor(ns, path.className, Kind::Instance);
-    if (!reg) return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no instance provider for " + path.className + " in " + ns);
-    std::string error;
-    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
-    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
-    Collector col;
-    col.nameSpace = ns;
-    CMPIContext* cctx = newContext(ns, ctx);
-    ResultObj* res = make<ResultObj>(this, &col);
-    ObjectPath full = path;
-    full.nameSpace = ns;
-    PathObj* cop = make<PathObj>(this, full);
-    Instance copy = inst;
-    copy.path = full;
-    InstanceObj* ci = make<InstanceObj>(this, std::move(copy));
-    CharList pl(props);
-    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-        if (!mi->ft || !mi->ft->modifyInstance) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-        return mi->ft->modifyInstance(mi, cctx, res, cop, ci, pl.get());
-    });
-    res->sink = nullptr;
     Result result;
-    finish(result, col, st);
+    if (auto* mi = serving<CMPIInstanceMI>(path, Kind::Instance, CMPI_RC_ERR_NOT_SUPPORTED, result)) {
+        Call call(this, path, ctx);
+        InstanceObj* ci = call.instance(inst);
+        CharList pl(props);
+        call.run(result, mi, &CMPIInstanceMIFT::modifyInstance, "", ci, pl.get());
+    }
     return result;
 }
 
 Result Host::Impl::create(const ObjectPath& path, const Instance& inst, const NamedValues* ctx) {
-    std::string ns = nameSpaceOf(path);
-    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
-    const Registration* reg = registrationFor(ns, path.className, Kind::Instance);
-    if (!reg) return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no instance provider for " + path.className + " in " + ns);
-    std::string error;
-    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
-    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
-    Collector col;
-    col.nameSpace = ns;
-    CMPIContext* cctx = newContext(ns, ctx);
-    ResultObj* res = make<ResultObj>(this, &col);
-    ObjectPath full = path;
-    full.nameSpace = ns;
-    PathObj* cop = make<PathObj>(this, full);
-    Instance copy = inst;
-    copy.path = full;
-    InstanceObj* ci = make<InstanceObj>(this, std::move(copy));
-    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-        if (!mi->ft || !mi->ft->createInstance) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-        return mi->ft->createInstance(mi, cctx, res, cop, ci);
-    });
-    res->sink = nullptr;
     Result result;
-    finish(result, col, st);
+    if (auto* mi = serving<CMPIInstanceMI>(path, Kind::Instance, CMPI_RC_ERR_NOT_SUPPORTED, result)) {
+        Call call(this, path, ctx);
+        call.run(result, mi, &CMPIInstanceMIFT::createInstance, "", call.instance(inst));
+    }
     return result;
 }
 
 Result Host::Impl::remove(const ObjectPath& path, const NamedValues* ctx) {
-    std::string ns = nameSpaceOf(path);
-    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
-    const Registration* reg = registrationFor(ns, path.className, Kind::Instance);
-    if (!reg) return failure(CMPI_RC_ERR_NOT_FOUND, "no instance provider for " + path.className + " in " + ns);
-    std::string error;
-    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
-    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
-    Collector col;
-    col.nameSpace = ns;
-    CMPIContext* cctx = newContext(ns, ctx);
-    ResultObj* res = make<ResultObj>(this, &col);
-    ObjectPath full = path;
-    full.nameSpace = ns;
-    PathObj* cop = make<PathObj>(this, full);
-    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-        if (!mi->ft || !mi->ft->deleteInstance) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-        return mi->ft->deleteInstance(mi, cctx, res, cop);
-    });
-    res->sink = nullptr;
     Result result;
-    finish(result, col, st);
+    if (auto* mi = serving<CMPIInstanceMI>(path, Kind::Instance, CMPI_RC_ERR_NOT_FOUND, result))
+        Call(this, path, ctx).run(result, mi, &CMPIInstanceMIFT::deleteInstance, "");
     return result;
 }
 
 Result Host::Impl::query(const ObjectPath& classPath, const std::string& queryText, const std::string& language,
                          const NamedValues* ctx) {
-    std::string ns = nameSpaceOf(classPath);
-    if (!repo.exists(classPath.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + classPath.className);
-    const Registration* reg = registrationFor(ns, classPath.className, Kind::Instance);
-    if (!reg) return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no instance provider for " + classPath.className + " in " + ns);
-    std::string error;
-    auto* mi = static_cast<CMPIInstanceMI*>(miFor(*providerOf(*reg), Kind::Instance, error));
-    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
-    Collector col;
-    col.nameSpace = ns;
-    CMPIContext* cctx = newContext(ns, ctx);
-    ResultObj* res = make<ResultObj>(this, &col);
-    PathObj* cop = make<PathObj>(this, ObjectPath(ns, classPath.className));
-    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-        if (!mi->ft || !mi->ft->execQuery) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-        return mi->ft->execQuery(mi, cctx, res, cop, queryText.c_str(), orNull(language));
-    });
-    res->sink = nullptr;
     Result result;
-    finish(result, col, st);
+    if (auto* mi = serving<CMPIInstanceMI>(classPath, Kind::Instance, CMPI_RC_ERR_NOT_SUPPORTED, result))
+        Call(this, ObjectPath(classPath.nameSpace, classPath.className), ctx)
+            .run(result, mi, &CMPIInstanceMIFT::execQuery, "", queryText.c_str(), orNull(language));
     return result;
 }
 
@@ -558,39 +509,28 @@ Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& 
     full.nameSpace = ns;
     Result result;
     for (auto& group : groups) {
-        std::string error;
-        auto* mi = static_cast<CMPIAssociationMI*>(miFor(*group.first, Kind::Association, error));
-        if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
+        auto* mi = miOf<CMPIAssociationMI>(*group.first, Kind::Association, result);
+        if (!mi) return result;
         std::vector<std::string> filters = filter.empty() ? group.second : std::vector<std::string>{filter};
         for (const auto& f : filters) {
-            Collector col;
-            col.nameSpace = ns;
-            CMPIContext* cctx = newContext(ns, ctx);
-            ResultObj* res = make<ResultObj>(this, &col);
-            PathObj* cop = make<PathObj>(this, full);
+            Call call(this, full, ctx);
             CharList pl(props);
-            CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-                if (!mi->ft) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "provider has no function table");
-                switch (op) {
-                case AssocOp::Associators:
-                    if (!mi->ft->associators) break;
-                    return mi->ft->associators(mi, cctx, res, cop, f.c_str(), orNull(resultClass), orNull(role),
-                                               orNull(resultRole), pl.get());
-                case AssocOp::AssociatorNames:
-                    if (!mi->ft->associatorNames) break;
-                    return mi->ft->associatorNames(mi, cctx, res, cop, f.c_str(), orNull(resultClass), orNull(role),
-                                                   orNull(resultRole));
-                case AssocOp::References:
-                    if (!mi->ft->references) break;
-                    return mi->ft->references(mi, cctx, res, cop, f.c_str(), orNull(role), pl.get());
-                case AssocOp::ReferenceNames:
-                    if (!mi->ft->referenceNames) break;
-                    return mi->ft->referenceNames(mi, cctx, res, cop, f.c_str(), orNull(role));
-                }
-                return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-            });
-            res->sink = nullptr;
-            finish(result, col, st);
+            const char* noTable = "provider has no function table";
+            switch (op) {
+            case AssocOp::Associators:
+                call.run(result, mi, &CMPIAssociationMIFT::associators, noTable, f.c_str(), orNull(resultClass),
+                         orNull(role), orNull(resultRole), pl.get());
+                break;
+            case AssocOp::AssociatorNames:
+                call.run(result, mi, &CMPIAssociationMIFT::associatorNames, noTable, f.c_str(), orNull(resultClass),
+                         orNull(role), orNull(resultRole));
+                break;
+            case AssocOp::References:
+                call.run(result, mi, &CMPIAssociationMIFT::references, noTable, f.c_str(), orNull(role), pl.get());
+                break;
+            case AssocOp::ReferenceNames:
+                call.run(result, mi, &CMPIAssociationMIFT::referenceNames, noTable, f.c_str(), orNull(role));
+            }
             if (!result.ok()) return result;
         }
     }
@@ -598,33 +538,17 @@ Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& 
 }
 
 Result Host::Impl::invoke(const ObjectPath& path, const std::string& method, const Args& in, const NamedValues* ctx) {
-    std::string ns = nameSpaceOf(path);
-    if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
-    const Registration* reg = registrationFor(ns, path.className, Kind::Method);
-    if (!reg) return failure(CMPI_RC_ERR_NOT_SUPPORTED, "no method provider for " + path.className + " in " + ns);
-    std::string error;
-    auto* mi = static_cast<CMPIMethodMI*>(miFor(*providerOf(*reg), Kind::Method, error));
-    if (!mi) return failure(CMPI_RC_ERR_FAILED, error);
-    Collector col;
-    col.nameSpace = ns;
-    CMPIContext* cctx = newContext(ns, ctx);
-    ResultObj* res = make<ResultObj>(this, &col);
-    ObjectPath full = path;
-    full.nameSpace = ns;
-    PathObj* cop = make<PathObj>(this, full);
+    Result result;
+    auto* mi = serving<CMPIMethodMI>(path, Kind::Method, CMPI_RC_ERR_NOT_SUPPORTED, result);
+    if (!mi) return result;
+    Call call(this, path, ctx);
     ArgsObj* inArgs = make<ArgsObj>(this, in);
     ArgsObj* outArgs = make<ArgsObj>(this, Args());
-    CMPIStatus st = callProvider(this, [&]() -> CMPIStatus {
-        if (!mi->ft || !mi->ft->invokeMethod) return status(this, CMPI_RC_ERR_NOT_SUPPORTED, "");
-        return mi->ft->invokeMethod(mi, cctx, res, cop, method.c_str(), inArgs, outArgs);
-    });
-    res->sink = nullptr;
-    Result result;
-    finish(result, col, st);
+    call.run(result, mi, &CMPIMethodMIFT::invokeMethod, "", method.c_str(), inArgs, outArgs);
     result.outArgs = outArgs->args;
-    if (!col.data.empty()) {
+    if (!call.col.data.empty()) {
         result.hasReturnValue = true;
-        result.returnValue = col.data.front();
+        result.returnValue = call.col.data.front();
     }
     return result;
 }

@@ -6,6 +6,7 @@
 #include <cmpift.h>
 
 #include <atomic>
+#include <cstring>
 #include <map>
 #include <memory>
 #include <mutex>
@@ -173,6 +174,14 @@ bool release(const void* key);  // false: not a clone (request- or host-owned)
 void releaseAll(HostImpl* host);
 }  // namespace clones
 
+// A function table with every entry null.
+template <class T>
+T zeroed() {
+    T t;
+    std::memset(&t, 0, sizeof t);
+    return t;
+}
+
 // Creates an object in the current arena of host (the request's, or the host's own).
 template <class T, class... A>
 T* make(HostImpl* host, A&&... args);
@@ -206,6 +215,7 @@ CMPIrc readValue(const CMPIValue* value, CMPIType type, Value& out);
 CMPIData makeData(HostImpl* host, const Value& v, CMPIValueState extraState = 0, Arena* arena = nullptr);
 CMPIData nullData(CMPIValueState state = CMPI_nullValue);
 
+CMPIStatus rcStatus(CMPIrc rc);  // no message
 CMPIStatus okStatus();
 CMPIStatus status(HostImpl* host, CMPIrc rc, const std::string& message, Arena* arena = nullptr);
 void setStatus(CMPIStatus* st, CMPIrc rc);
@@ -268,8 +278,16 @@ private:
     struct Provider;
     enum class Kind { Instance, Association, Method };
 
+    struct Call;
+
     Provider* providerOf(const Registration& r);
     void* miFor(Provider& p, Kind kind, std::string& error);
+    // The MI, or null with the failure set in result.
+    template <class MI>
+    MI* miOf(Provider& p, Kind kind, Result& result);
+    // The MI of the provider serving path's class; none registered fails with rc none.
+    template <class MI>
+    MI* serving(const ObjectPath& path, Kind kind, CMPIrc none, Result& result);
     const Registration* registrationFor(const std::string& ns, const std::string& cls, Kind kind) const;
     void finish(Result& r, detail::Collector& c, const CMPIStatus& st);
     CMPIContext* newContext(const std::string& ns, const NamedValues* ctx);

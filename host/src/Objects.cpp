@@ -424,17 +424,17 @@ CMPIData makeData(HostImpl* host, const Value& v, CMPIValueState extraState, Are
     return d;
 }
 
-CMPIStatus okStatus() {
+CMPIStatus rcStatus(CMPIrc rc) {
     CMPIStatus s;
-    s.rc = CMPI_RC_OK;
+    s.rc = rc;
     s.msg = nullptr;
     return s;
 }
 
+CMPIStatus okStatus() { return rcStatus(CMPI_RC_OK); }
+
 CMPIStatus status(HostImpl* host, CMPIrc rc, const std::string& message, Arena* arena) {
-    CMPIStatus s;
-    s.rc = rc;
-    s.msg = nullptr;
+    CMPIStatus s = rcStatus(rc);
     if (host && !message.empty()) {
         try {
             s.msg = makeIn<StringObj>(arena ? *arena : host->arena(), host, message);
@@ -445,10 +445,7 @@ CMPIStatus status(HostImpl* host, CMPIrc rc, const std::string& message, Arena* 
 }
 
 void setStatus(CMPIStatus* st, CMPIrc rc) {
-    if (st) {
-        st->rc = rc;
-        st->msg = nullptr;
-    }
+    if (st) *st = rcStatus(rc);
 }
 
 void setStatus(CMPIStatus* st, HostImpl* host, CMPIrc rc, const std::string& message, Arena* arena) {
@@ -562,26 +559,11 @@ CMPIStatus guardedStatus(F&& f) noexcept {
     try {
         return f();
     } catch (...) {
-        CMPIStatus s;
-        s.rc = CMPI_RC_ERR_FAILED;
-        s.msg = nullptr;
-        return s;
+        return rcStatus(CMPI_RC_ERR_FAILED);
     }
 }
 
-CMPIStatus invalidHandle() {
-    CMPIStatus s;
-    s.rc = CMPI_RC_ERR_INVALID_HANDLE;
-    s.msg = nullptr;
-    return s;
-}
-
-CMPIStatus rcStatus(CMPIrc rc) {
-    CMPIStatus s;
-    s.rc = rc;
-    s.msg = nullptr;
-    return s;
-}
+CMPIStatus invalidHandle() { return rcStatus(CMPI_RC_ERR_INVALID_HANDLE); }
 
 // release(): a clone goes at once; anything else belongs to its request or host.
 template <class C>
@@ -596,17 +578,41 @@ CMPIData notFound(CMPIStatus* rc, CMPIrc code) {
     return nullData(static_cast<CMPIValueState>(CMPI_nullValue | CMPI_notFound));
 }
 
-// --- String
+// clone(): a copy the provider owns, of what each object holds.
+StringObj* copyOf(StringObj* o) { return makeClone<StringObj>(o->host, o->text); }
+InstanceObj* copyOf(InstanceObj* o) {
+    InstanceObj* c = makeClone<InstanceObj>(o->host, o->inst);
+    c->filtered = o->filtered;
+    c->filter = o->filter;
+    return c;
+}
+PathObj* copyOf(PathObj* o) {
+    PathObj* c = makeClone<PathObj>(o->host, o->path);
+    c->hostname = o->hostname;
+    return c;
+}
+ArgsObj* copyOf(ArgsObj* o) { return makeClone<ArgsObj>(o->host, o->args); }
+ArrayObj* copyOf(ArrayObj* o) { return makeClone<ArrayObj>(o->host, o->type, o->elements); }
+EnumObj* copyOf(EnumObj* o) {
+    EnumObj* c = makeClone<EnumObj>(o->host, o->items);
+    c->next = o->next;
+    return c;
+}
+DateTimeObj* copyOf(DateTimeObj* o) { return makeClone<DateTimeObj>(o->host, o->text, o->binary, o->interval); }
+ContextObj* copyOf(ContextObj* o) { return makeClone<ContextObj>(o->host, o->entries); }
 
-CMPIStatus strRelease(CMPIString* s) { return releaseAny(s); }
-CMPIString* strClone(const CMPIString* s, CMPIStatus* rc) {
-    if (!s) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
-    return guarded<CMPIString*>(rc, nullptr, [&] {
-        StringObj* o = self<StringObj>(s);
+template <class O, class C = typename O::CmpiType>
+C* cloneOf(const C* x, CMPIStatus* rc) {
+    if (!x) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
+    return guarded<C*>(rc, nullptr, [&] {
+        O* c = copyOf(self<O>(x));
         setStatus(rc, CMPI_RC_OK);
-        return static_cast<CMPIString*>(makeClone<StringObj>(o->host, o->text));
+        return static_cast<C*>(c);
     });
 }
+
+// --- String
+
 char* strGetCharPtr(const CMPIString* s, CMPIStatus* rc) {
     if (!s) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
     setStatus(rc, CMPI_RC_OK);
@@ -622,18 +628,6 @@ bool inFilter(const InstanceObj* o, const std::string& name) {
     return false;
 }
 
-CMPIStatus instRelease(CMPIInstance* i) { return releaseAny(i); }
-CMPIInstance* instClone(const CMPIInstance* i, CMPIStatus* rc) {
-    if (!i) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
-    return guarded<CMPIInstance*>(rc, nullptr, [&] {
-        InstanceObj* o = self<InstanceObj>(i);
-        InstanceObj* c = makeClone<InstanceObj>(o->host, o->inst);
-        c->filtered = o->filtered;
-        c->filter = o->filter;
-        setStatus(rc, CMPI_RC_OK);
-        return static_cast<CMPIInstance*>(c);
-    });
-}
 CMPIData instGetProperty(const CMPIInstance* i, const char* name, CMPIStatus* rc) {
     if (!i || !name) return notFound(rc, i ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_INVALID_HANDLE);
     return guarded<CMPIData>(rc, nullData(), [&] {
@@ -730,17 +724,6 @@ CMPIStatus instSetObjectPath(CMPIInstance* i, const CMPIObjectPath* op) {
 
 // --- Object path
 
-CMPIStatus pathRelease(CMPIObjectPath* p) { return releaseAny(p); }
-CMPIObjectPath* pathClone(const CMPIObjectPath* p, CMPIStatus* rc) {
-    if (!p) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
-    return guarded<CMPIObjectPath*>(rc, nullptr, [&] {
-        PathObj* o = self<PathObj>(p);
-        PathObj* c = makeClone<PathObj>(o->host, o->path);
-        c->hostname = o->hostname;
-        setStatus(rc, CMPI_RC_OK);
-        return static_cast<CMPIObjectPath*>(c);
-    });
-}
 CMPIStatus pathSetNameSpace(CMPIObjectPath* p, const char* ns) {
     if (!p) return invalidHandle();
     return guardedStatus([&] {
@@ -902,66 +885,61 @@ CMPIString* pathToString(const CMPIObjectPath* p, CMPIStatus* rc) {
     });
 }
 
-// --- Args
+// --- Named values: an Args' arguments and a context's entries work alike but for the rc of a
+// name or index they lack.
 
-CMPIStatus argsRelease(CMPIArgs* a) { return releaseAny(a); }
-CMPIArgs* argsClone(const CMPIArgs* a, CMPIStatus* rc) {
-    if (!a) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
-    return guarded<CMPIArgs*>(rc, nullptr, [&] {
-        ArgsObj* o = self<ArgsObj>(a);
+template <class O, NamedValues O::*values, CMPIrc missing>
+struct Named {
+    using C = typename O::CmpiType;
+    static CMPIStatus add(const C* c, const char* name, const CMPIValue* value, const CMPIType type) {
+        if (!c) return invalidHandle();
+        if (!name || !*name) return rcStatus(CMPI_RC_ERR_INVALID_PARAMETER);
+        return guardedStatus([&] {
+            Value v;
+            CMPIrc r = readValue(value, type, v);
+            if (r != CMPI_RC_OK) return rcStatus(r);
+            (self<O>(c)->*values).set(name, std::move(v));
+            return okStatus();
+        });
+    }
+    static CMPIData get(const C* c, const char* name, CMPIStatus* rc) {
+        if (!c || !name) return notFound(rc, c ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_INVALID_HANDLE);
+        return guarded<CMPIData>(rc, nullData(), [&] {
+            O* o = self<O>(c);
+            const Value* v = (o->*values).find(name);
+            if (!v) return notFound(rc, missing);
+            setStatus(rc, CMPI_RC_OK);
+            return makeData(o->host, *v);
+        });
+    }
+    static CMPIData getAt(const C* c, CMPICount index, CMPIString** name, CMPIStatus* rc) {
+        if (!c) return notFound(rc, CMPI_RC_ERR_INVALID_HANDLE);
+        return guarded<CMPIData>(rc, nullData(), [&] {
+            O* o = self<O>(c);
+            if (index >= (o->*values).size()) return notFound(rc, missing);
+            const auto& item = (o->*values).at(index);
+            if (name) *name = make<StringObj>(o->host, item.first);
+            setStatus(rc, CMPI_RC_OK);
+            return makeData(o->host, item.second);
+        });
+    }
+    static CMPICount count(const C* c, CMPIStatus* rc) {
+        if (!c) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), 0;
         setStatus(rc, CMPI_RC_OK);
-        return static_cast<CMPIArgs*>(makeClone<ArgsObj>(o->host, o->args));
-    });
-}
-CMPIStatus argsAddArg(const CMPIArgs* a, const char* name, const CMPIValue* value, const CMPIType type) {
-    if (!a) return invalidHandle();
-    if (!name || !*name) return rcStatus(CMPI_RC_ERR_INVALID_PARAMETER);
-    return guardedStatus([&] {
-        Value v;
-        CMPIrc r = readValue(value, type, v);
-        if (r != CMPI_RC_OK) return rcStatus(r);
-        self<ArgsObj>(a)->args.set(name, std::move(v));
-        return okStatus();
-    });
-}
-CMPIData argsGetArg(const CMPIArgs* a, const char* name, CMPIStatus* rc) {
-    if (!a || !name) return notFound(rc, a ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_INVALID_HANDLE);
-    return guarded<CMPIData>(rc, nullData(), [&] {
-        ArgsObj* o = self<ArgsObj>(a);
-        const Value* v = o->args.find(name);
-        if (!v) return notFound(rc, CMPI_RC_ERR_NOT_FOUND);
-        setStatus(rc, CMPI_RC_OK);
-        return makeData(o->host, *v);
-    });
-}
-CMPIData argsGetArgAt(const CMPIArgs* a, CMPICount index, CMPIString** name, CMPIStatus* rc) {
-    if (!a) return notFound(rc, CMPI_RC_ERR_INVALID_HANDLE);
-    return guarded<CMPIData>(rc, nullData(), [&] {
-        ArgsObj* o = self<ArgsObj>(a);
-        if (index >= o->args.size()) return notFound(rc, CMPI_RC_ERR_NOT_FOUND);
-        const auto& item = o->args.at(index);
-        if (name) *name = make<StringObj>(o->host, item.first);
-        setStatus(rc, CMPI_RC_OK);
-        return makeData(o->host, item.second);
-    });
-}
-CMPICount argsGetArgCount(const CMPIArgs* a, CMPIStatus* rc) {
-    if (!a) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), 0;
-    setStatus(rc, CMPI_RC_OK);
-    return static_cast<CMPICount>(self<ArgsObj>(a)->args.size());
-}
+        return static_cast<CMPICount>((self<O>(c)->*values).size());
+    }
+    static std::string text(const void* object) {
+        std::string out;
+        for (const auto& a : static_cast<const O*>(static_cast<const C*>(object))->*values)
+            out += a.first + " = " + a.second.toText() + ";\n";
+        return out;
+    }
+};
+using ArgsNamed = Named<ArgsObj, &ArgsObj::args, CMPI_RC_ERR_NOT_FOUND>;
+using ContextNamed = Named<ContextObj, &ContextObj::entries, CMPI_RC_ERR_NO_SUCH_PROPERTY>;
 
 // --- Array
 
-CMPIStatus arrRelease(CMPIArray* a) { return releaseAny(a); }
-CMPIArray* arrClone(const CMPIArray* a, CMPIStatus* rc) {
-    if (!a) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
-    return guarded<CMPIArray*>(rc, nullptr, [&] {
-        ArrayObj* o = self<ArrayObj>(a);
-        setStatus(rc, CMPI_RC_OK);
-        return static_cast<CMPIArray*>(makeClone<ArrayObj>(o->host, o->type, o->elements));
-    });
-}
 CMPICount arrGetSize(const CMPIArray* a, CMPIStatus* rc) {
     if (!a) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), 0;
     setStatus(rc, CMPI_RC_OK);
@@ -997,17 +975,6 @@ CMPIStatus arrSetElementAt(CMPIArray* a, CMPICount index, const CMPIValue* value
 
 // --- Enumeration
 
-CMPIStatus enumRelease(CMPIEnumeration* e) { return releaseAny(e); }
-CMPIEnumeration* enumClone(const CMPIEnumeration* e, CMPIStatus* rc) {
-    if (!e) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
-    return guarded<CMPIEnumeration*>(rc, nullptr, [&] {
-        EnumObj* o = self<EnumObj>(e);
-        EnumObj* c = makeClone<EnumObj>(o->host, o->items);
-        c->next = o->next;
-        setStatus(rc, CMPI_RC_OK);
-        return static_cast<CMPIEnumeration*>(c);
-    });
-}
 CMPIData enumGetNext(const CMPIEnumeration* e, CMPIStatus* rc) {
     if (!e) return notFound(rc, CMPI_RC_ERR_INVALID_HANDLE);
     return guarded<CMPIData>(rc, nullData(), [&] {
@@ -1037,15 +1004,6 @@ CMPIArray* enumToArray(const CMPIEnumeration* e, CMPIStatus* rc) {
 
 // --- Datetime
 
-CMPIStatus dtRelease(CMPIDateTime* d) { return releaseAny(d); }
-CMPIDateTime* dtClone(const CMPIDateTime* d, CMPIStatus* rc) {
-    if (!d) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
-    return guarded<CMPIDateTime*>(rc, nullptr, [&] {
-        DateTimeObj* o = self<DateTimeObj>(d);
-        setStatus(rc, CMPI_RC_OK);
-        return static_cast<CMPIDateTime*>(makeClone<DateTimeObj>(o->host, o->text, o->binary, o->interval));
-    });
-}
 CMPIUint64 dtGetBinaryFormat(const CMPIDateTime* d, CMPIStatus* rc) {
     if (!d) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), CMPIUint64(0);
     setStatus(rc, CMPI_RC_OK);
@@ -1065,55 +1023,6 @@ CMPIBoolean dtIsInterval(const CMPIDateTime* d, CMPIStatus* rc) {
     return self<DateTimeObj>(d)->interval ? 1 : 0;
 }
 
-// --- Context
-
-CMPIStatus ctxRelease(CMPIContext* c) { return releaseAny(c); }
-CMPIContext* ctxClone(const CMPIContext* c, CMPIStatus* rc) {
-    if (!c) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), nullptr;
-    return guarded<CMPIContext*>(rc, nullptr, [&] {
-        ContextObj* o = self<ContextObj>(c);
-        setStatus(rc, CMPI_RC_OK);
-        return static_cast<CMPIContext*>(makeClone<ContextObj>(o->host, o->entries));
-    });
-}
-CMPIData ctxGetEntry(const CMPIContext* c, const char* name, CMPIStatus* rc) {
-    if (!c || !name) return notFound(rc, c ? CMPI_RC_ERR_INVALID_PARAMETER : CMPI_RC_ERR_INVALID_HANDLE);
-    return guarded<CMPIData>(rc, nullData(), [&] {
-        ContextObj* o = self<ContextObj>(c);
-        const Value* v = o->entries.find(name);
-        if (!v) return notFound(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
-        setStatus(rc, CMPI_RC_OK);
-        return makeData(o->host, *v);
-    });
-}
-CMPIData ctxGetEntryAt(const CMPIContext* c, CMPICount index, CMPIString** name, CMPIStatus* rc) {
-    if (!c) return notFound(rc, CMPI_RC_ERR_INVALID_HANDLE);
-    return guarded<CMPIData>(rc, nullData(), [&] {
-        ContextObj* o = self<ContextObj>(c);
-        if (index >= o->entries.size()) return notFound(rc, CMPI_RC_ERR_NO_SUCH_PROPERTY);
-        const auto& item = o->entries.at(index);
-        if (name) *name = make<StringObj>(o->host, item.first);
-        setStatus(rc, CMPI_RC_OK);
-        return makeData(o->host, item.second);
-    });
-}
-CMPICount ctxGetEntryCount(const CMPIContext* c, CMPIStatus* rc) {
-    if (!c) return setStatus(rc, CMPI_RC_ERR_INVALID_HANDLE), 0;
-    setStatus(rc, CMPI_RC_OK);
-    return static_cast<CMPICount>(self<ContextObj>(c)->entries.size());
-}
-CMPIStatus ctxAddEntry(const CMPIContext* c, const char* name, const CMPIValue* value, const CMPIType type) {
-    if (!c) return invalidHandle();
-    if (!name || !*name) return rcStatus(CMPI_RC_ERR_INVALID_PARAMETER);
-    return guardedStatus([&] {
-        Value v;
-        CMPIrc r = readValue(value, type, v);
-        if (r != CMPI_RC_OK) return rcStatus(r);
-        self<ContextObj>(c)->entries.set(name, std::move(v));
-        return okStatus();
-    });
-}
-
 // --- Result
 
 Collector* sinkOf(const CMPIResult* r) { return self<ResultObj>(r)->sink; }
@@ -1121,7 +1030,6 @@ CMPIStatus closedResult(const CMPIResult* r) {
     return status(self<ResultObj>(r)->host, CMPI_RC_ERR_FAILED, "result used after its request returned");
 }
 
-CMPIStatus resRelease(CMPIResult* r) { return releaseAny(r); }
 CMPIResult* resClone(const CMPIResult* r, CMPIStatus* rc) {
     setStatus(rc, r ? CMPI_RC_ERR_NOT_SUPPORTED : CMPI_RC_ERR_INVALID_HANDLE);
     return nullptr;
@@ -1173,20 +1081,13 @@ CMPIStatus resReturnError(const CMPIResult* r, const CMPIError*) {
     return rcStatus(r ? CMPI_RC_ERR_NOT_SUPPORTED : CMPI_RC_ERR_INVALID_HANDLE);
 }
 
-template <class T>
-T zeroed() {
-    T t;
-    std::memset(&t, 0, sizeof t);
-    return t;
-}
-
 }  // namespace
 
 CMPIStringFT stringFT = [] {
     auto t = zeroed<CMPIStringFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = strRelease;
-    t.clone = strClone;
+    t.release = releaseAny<CMPIString>;
+    t.clone = cloneOf<StringObj>;
     t.getCharPtr = strGetCharPtr;
     return t;
 }();
@@ -1194,8 +1095,8 @@ CMPIStringFT stringFT = [] {
 CMPIInstanceFT instanceFT = [] {
     auto t = zeroed<CMPIInstanceFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = instRelease;
-    t.clone = instClone;
+    t.release = releaseAny<CMPIInstance>;
+    t.clone = cloneOf<InstanceObj>;
     t.getProperty = instGetProperty;
     t.getPropertyAt = instGetPropertyAt;
     t.getPropertyCount = instGetPropertyCount;
@@ -1210,8 +1111,8 @@ CMPIInstanceFT instanceFT = [] {
 CMPIObjectPathFT objectPathFT = [] {
     auto t = zeroed<CMPIObjectPathFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = pathRelease;
-    t.clone = pathClone;
+    t.release = releaseAny<CMPIObjectPath>;
+    t.clone = cloneOf<PathObj>;
     t.setNameSpace = pathSetNameSpace;
     t.getNameSpace = pathGetNameSpace;
     t.setHostname = pathSetHostname;
@@ -1235,20 +1136,20 @@ CMPIObjectPathFT objectPathFT = [] {
 CMPIArgsFT argsFT = [] {
     auto t = zeroed<CMPIArgsFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = argsRelease;
-    t.clone = argsClone;
-    t.addArg = argsAddArg;
-    t.getArg = argsGetArg;
-    t.getArgAt = argsGetArgAt;
-    t.getArgCount = argsGetArgCount;
+    t.release = releaseAny<CMPIArgs>;
+    t.clone = cloneOf<ArgsObj>;
+    t.addArg = ArgsNamed::add;
+    t.getArg = ArgsNamed::get;
+    t.getArgAt = ArgsNamed::getAt;
+    t.getArgCount = ArgsNamed::count;
     return t;
 }();
 
 CMPIArrayFT arrayFT = [] {
     auto t = zeroed<CMPIArrayFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = arrRelease;
-    t.clone = arrClone;
+    t.release = releaseAny<CMPIArray>;
+    t.clone = cloneOf<ArrayObj>;
     t.getSize = arrGetSize;
     t.getSimpleType = arrGetSimpleType;
     t.getElementAt = arrGetElementAt;
@@ -1259,8 +1160,8 @@ CMPIArrayFT arrayFT = [] {
 CMPIEnumerationFT enumerationFT = [] {
     auto t = zeroed<CMPIEnumerationFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = enumRelease;
-    t.clone = enumClone;
+    t.release = releaseAny<CMPIEnumeration>;
+    t.clone = cloneOf<EnumObj>;
     t.getNext = enumGetNext;
     t.hasNext = enumHasNext;
     t.toArray = enumToArray;
@@ -1270,8 +1171,8 @@ CMPIEnumerationFT enumerationFT = [] {
 CMPIDateTimeFT dateTimeFT = [] {
     auto t = zeroed<CMPIDateTimeFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = dtRelease;
-    t.clone = dtClone;
+    t.release = releaseAny<CMPIDateTime>;
+    t.clone = cloneOf<DateTimeObj>;
     t.getBinaryFormat = dtGetBinaryFormat;
     t.getStringFormat = dtGetStringFormat;
     t.isInterval = dtIsInterval;
@@ -1281,19 +1182,19 @@ CMPIDateTimeFT dateTimeFT = [] {
 CMPIContextFT contextFT = [] {
     auto t = zeroed<CMPIContextFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = ctxRelease;
-    t.clone = ctxClone;
-    t.getEntry = ctxGetEntry;
-    t.getEntryAt = ctxGetEntryAt;
-    t.getEntryCount = ctxGetEntryCount;
-    t.addEntry = ctxAddEntry;
+    t.release = releaseAny<CMPIContext>;
+    t.clone = cloneOf<ContextObj>;
+    t.getEntry = ContextNamed::get;
+    t.getEntryAt = ContextNamed::getAt;
+    t.getEntryCount = ContextNamed::count;
+    t.addEntry = ContextNamed::add;
     return t;
 }();
 
 CMPIResultFT resultFT = [] {
     auto t = zeroed<CMPIResultFT>();
     t.ftVersion = CMPICurrentVersion;
-    t.release = resRelease;
+    t.release = releaseAny<CMPIResult>;
     t.clone = resClone;
     t.returnData = resReturnData;
     t.returnInstance = resReturnInstance;
@@ -1320,9 +1221,7 @@ bool describeObject(const void* object, std::string& text, std::string& type) {
         text = static_cast<const InstanceObj*>(static_cast<const CMPIInstance*>(object))->inst.toMof();
     } else if (ft == &argsFT) {
         type = "CMPIArgs";
-        text.clear();
-        for (const auto& a : static_cast<const ArgsObj*>(static_cast<const CMPIArgs*>(object))->args)
-            text += a.first + " = " + a.second.toText() + ";\n";
+        text = ArgsNamed::text(object);
     } else if (ft == &arrayFT) {
         type = "CMPIArray";
         const ArrayObj* a = static_cast<const ArrayObj*>(static_cast<const CMPIArray*>(object));
@@ -1336,9 +1235,7 @@ bool describeObject(const void* object, std::string& text, std::string& type) {
         text = static_cast<const DateTimeObj*>(static_cast<const CMPIDateTime*>(object))->text;
     } else if (ft == &contextFT) {
         type = "CMPIContext";
-        text.clear();
-        for (const auto& a : static_cast<const ContextObj*>(static_cast<const CMPIContext*>(object))->entries)
-            text += a.first + " = " + a.second.toText() + ";\n";
+        text = ContextNamed::text(object);
     } else if (ft == &resultFT) {
         type = "CMPIResult";
         text = "CMPIResult";

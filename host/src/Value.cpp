@@ -383,83 +383,37 @@ Value Value::null(CimType type, bool array) {
     return v;
 }
 
-Value Value::boolean(bool b) {
-    Value v;
-    v.type_ = CimType::Boolean;
-    v.null_ = false;
-    v.elements_.emplace_back(b);
-    return v;
-}
+Value Value::boolean(bool b) { return scalar(CimType::Boolean, b); }
 
 Value Value::char16(std::uint16_t c) { return fromUnsigned(CimType::Char16, c); }
 
-Value Value::real32(float f) {
-    Value v;
-    v.type_ = CimType::Real32;
-    v.null_ = false;
-    v.elements_.emplace_back(static_cast<double>(f));
-    return v;
-}
+Value Value::real32(float f) { return scalar(CimType::Real32, static_cast<double>(f)); }
 
-Value Value::real64(double d) {
-    Value v;
-    v.type_ = CimType::Real64;
-    v.null_ = false;
-    v.elements_.emplace_back(d);
-    return v;
-}
+Value Value::real64(double d) { return scalar(CimType::Real64, d); }
 
 Value Value::fromUnsigned(CimType type, std::uint64_t u) {
     if (!isUnsigned(type)) throw std::logic_error("fromUnsigned needs an unsigned type");
     if (u > unsignedMax(type)) throw std::out_of_range(std::string("value out of range for ") + typeName(type));
-    Value v;
-    v.type_ = type;
-    v.null_ = false;
-    v.elements_.emplace_back(u);
-    return v;
+    return scalar(type, u);
 }
 
 Value Value::fromSigned(CimType type, std::int64_t s) {
     if (!isSigned(type)) throw std::logic_error("fromSigned needs a signed type");
     if (s < signedMin(type) || s > signedMax(type))
         throw std::out_of_range(std::string("value out of range for ") + typeName(type));
-    Value v;
-    v.type_ = type;
-    v.null_ = false;
-    v.elements_.emplace_back(s);
-    return v;
+    return scalar(type, s);
 }
 
-Value Value::string(std::string s) {
-    Value v;
-    v.type_ = CimType::String;
-    v.null_ = false;
-    v.elements_.emplace_back(std::move(s));
-    return v;
-}
+Value Value::string(std::string s) { return scalar(CimType::String, std::move(s)); }
 
-Value Value::dateTime(std::string s) {
-    Value v;
-    v.type_ = CimType::DateTime;
-    v.null_ = false;
-    v.elements_.emplace_back(std::move(s));
-    return v;
-}
+Value Value::dateTime(std::string s) { return scalar(CimType::DateTime, std::move(s)); }
 
 Value Value::reference(ObjectPath path) {
-    Value v;
-    v.type_ = CimType::Reference;
-    v.null_ = false;
-    v.elements_.emplace_back(std::make_shared<const ObjectPath>(std::move(path)));
-    return v;
+    return scalar(CimType::Reference, std::make_shared<const ObjectPath>(std::move(path)));
 }
 
 Value Value::instance(Instance inst) {
-    Value v;
-    v.type_ = CimType::Instance;
-    v.null_ = false;
-    v.elements_.emplace_back(std::make_shared<const Instance>(std::move(inst)));
-    return v;
+    return scalar(CimType::Instance, std::make_shared<const Instance>(std::move(inst)));
 }
 
 Value Value::array(CimType type, std::vector<Element> elements) {

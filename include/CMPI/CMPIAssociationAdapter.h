@@ -84,57 +84,57 @@ public:
     CMPIAssociationAdapter& operator=(const CMPIAssociationAdapter&) = delete;
 
     explicit operator bool() {
-        enter(__func__, __LINE__);
+        tracer(__func__, __LINE__, ENTERING);
         bool current = false;
         if (walked == Side::A) current = static_cast<bool>(endA);
         if (walked == Side::B) current = static_cast<bool>(endB);
-        leave(__func__, __LINE__);
+        tracer(__func__, __LINE__, EXITING);
         return current;
     }
 
     void operator++() {
-        enter(__func__, __LINE__);
+        tracer(__func__, __LINE__, ENTERING);
         if (walked == Side::A) ++endA;
         if (walked == Side::B) ++endB;
-        leave(__func__, __LINE__);
+        tracer(__func__, __LINE__, EXITING);
     }
 
     // True when resultClass can never be the class of the far end. Only the far end's own class
     // and its direct CIM parent are accepted, in any case. resultClass must not be null.
     bool isNotTargetClass(const char* resultClass) const {
         const std::string params = parameterList(" resultClass=", resultClass);
-        enter(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, ENTERING, params);
         bool notTarget = true;
         if (const AssociationEnd* far = farEnd())
             notTarget =
                 ::strcasecmp(resultClass, far->className) != 0 && ::strcasecmp(resultClass, far->parentClassName) != 0;
-        leave(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, EXITING, params);
         return notTarget;
     }
 
     // The far end's current element; null when the source was not one of the ends.
     CMPIObjectPath* getAssociatorNames() {
-        enter(__func__, __LINE__);
+        tracer(__func__, __LINE__, ENTERING);
         CMPIObjectPath* path = nullptr;
         if (requestedClassId == association.a.classId) path = endB.getObjectPath();
         if (requestedClassId == association.b.classId) path = endA.getObjectPath();
-        leave(__func__, __LINE__);
+        tracer(__func__, __LINE__, EXITING);
         return path;
     }
 
     CMPIInstance* getAssociator(const char** properties) {
         const std::string params = parameterList(" properties=", properties);
-        enter(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, ENTERING, params);
         CMPIInstance* instance = nullptr;
         if (requestedClassId == association.a.classId) instance = endB.getCMPIInstance(properties);
         if (requestedClassId == association.b.classId) instance = endA.getCMPIInstance(properties);
-        leave(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, EXITING, params);
         return instance;
     }
 
     // A path of the association class with its two references to the current pair.
     CMPIObjectPath* getObjectPath() {
-        enter(__func__, __LINE__);
+        tracer(__func__, __LINE__, ENTERING);
         CMPIObjectPath* path = ProviderUtilities::createObjectPath(broker, association.className, nameSpace);
         if (path) {
             CMPIObjectPath* toA = endA.getObjectPath();
@@ -143,14 +143,14 @@ public:
             ProviderUtilities::setKeyProperty(path, association.a.referenceName, toA);
             if (!association.bReferenceFirst) ProviderUtilities::setKeyProperty(path, association.b.referenceName, toB);
         }
-        leave(__func__, __LINE__);
+        tracer(__func__, __LINE__, EXITING);
         return path;
     }
 
     // The association instance: its references and its own properties.
     CMPIInstance* getCMPIInstance(const char** properties) {
         const std::string params = parameterList(" properties=", properties);
-        enter(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, ENTERING, params);
         CMPIObjectPath* path = getObjectPath();
         CMPIInstance* instance = ProviderUtilities::createInstance(broker, path);
         if (instance) {
@@ -161,13 +161,13 @@ public:
             }
             static_cast<Derived*>(this)->setAssociationProperties(instance);
         }
-        leave(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, EXITING, params);
         return instance;
     }
 
 protected:
     CMPIAssociationAdapter(const CMPIBroker* broker_, const CMPIContext* context_, const CMPIObjectPath* path,
-                           const AssociationClass& association_, const std::string& logger_, const char* file_)
+                           const AssociationClass& association_, const std::string& logger, const char* file)
         : broker(broker_),
           context(context_),
           nameSpace(ProviderUtilities::getNamespace(path)),
@@ -176,10 +176,9 @@ protected:
           endA(broker_, context_, nameSpace),
           endB(broker_, context_, nameSpace),
           association(association_),
-          logger(logger_),
-          file(file_) {
-        logRecord(logger, "CMPIAssociationAdapter", file, __LINE__, 4000,
-                  trace("requestedClassId", file, __LINE__, static_cast<unsigned>(requestedClassId)));
+          tracer(logger, file) {
+        tracer.variable("CMPIAssociationAdapter", __LINE__, "requestedClassId",
+                        static_cast<unsigned>(requestedClassId));
     }
     ~CMPIAssociationAdapter() = default;
 
@@ -190,8 +189,28 @@ protected:
     // reports failure.
     template <class Value, class Getter>
     void copyProperty(CMPIInstance* instance, const char* name, Getter getter) {
-        Value value{};
-        if (std::invoke(getter, model, value)) ProviderUtilities::setProperty(instance, name, value);
+        copyModelProperty<Value>(model, instance, name, getter);
+    }
+
+    // The trace of the derived constructor function around positioning, which body does.
+    template <class Body>
+    void construct(const char* function, const CMPIObjectPath* path, Body body) {
+        tracer.construction(function, broker, context, " objectPath=", path, body);
+    }
+
+    // The construction of the associations anchored on one element (see setAnchoredObjectPath):
+    // a source that is one end is positioned as that end; one of the association class
+    // (associationId) as setObjectPath positions it or, when that returns false, as end A.
+    template <class LocateA, class LocateB>
+    void constructAnchored(const char* function, const CMPIObjectPath* path, unsigned short associationId,
+                           LocateA locateA, LocateB locateB) {
+        construct(function, path, [&] {
+            if (requestedClassId == association.b.classId)
+                fromB(path, locateA);
+            else if (requestedClassId == association.a.classId ||
+                     (requestedClassId == associationId && !derived().setObjectPath(path)))
+                fromA(path, locateB);
+        });
     }
 
     // A class path of farClass for the far end of source. When source has keys, the model
@@ -201,16 +220,15 @@ protected:
     CMPIObjectPath* locate(const CMPIObjectPath* source, const char* farClass, Convert convert,
                            const char* conversion) {
         const std::string params = parameterList(" objectPath=", source, " farClass=", farClass);
-        enter(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, ENTERING, params);
         CMPIObjectPath* far = ProviderUtilities::createObjectPath(broker, farClass, nameSpace);
         if (ProviderUtilities::getKeyCount(source) != 0) {
             Nx::Moniker moniker = ProviderUtilities::transformObjectPathToMoniker(source);
             Nx::Moniker located = std::invoke(convert, model, moniker);
-            logRecord(logger, __func__, file, __LINE__, 3000,
-                      trace(file, (std::string("Returned from ") + conversion).c_str(), __LINE__, FREE_MESSAGE));
+            tracer.message(__func__, __LINE__, 3000, (std::string("Returned from ") + conversion).c_str());
             if (far) ProviderUtilities::transformMonikerToObjectPath(located, far);
         }
-        leave(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, EXITING, params);
         return far;
     }
 
@@ -256,7 +274,7 @@ protected:
         const AssociationEnd& anchorEnd = AnchorSide == Side::A ? association.a : association.b;
         const AssociationEnd& memberEnd = AnchorSide == Side::A ? association.b : association.a;
         const std::string params = parameterList(" objectPath=", path);
-        enter(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, ENTERING, params);
         walked = MemberSide;
         bool positioned = false;
         if (ProviderUtilities::getKeyCount(path) == 0) {
@@ -278,7 +296,7 @@ protected:
                 ProviderUtilities::getKeyProperty(located, identityKey, expected) && given == expected)
                 positionOnAnchor(anchor, anchorReference);
         }
-        leave(__func__, __LINE__, params);
+        tracer(__func__, __LINE__, EXITING, params);
         return positioned;
     }
 
@@ -316,21 +334,9 @@ private:
         return nullptr;
     }
 
-    void enter(const char* function, int line, const std::string& params = std::string()) const {
-        logRecord(logger, function, file, line, params.empty() ? 4000 : 3000,
-                  params.empty() ? trace(file, function, line, ENTERING)
-                                 : tracepara(file, function, line, params.c_str(), ENTERING));
-    }
-    void leave(const char* function, int line, const std::string& params = std::string()) const {
-        logRecord(logger, function, file, line, params.empty() ? 4000 : 3000,
-                  params.empty() ? trace(file, function, line, EXITING)
-                                 : tracepara(file, function, line, params.c_str(), EXITING));
-    }
-
     const AssociationClass& association;
     Side walked = Side::None;
-    const std::string& logger;
-    const char* file;
+    AdapterTrace tracer;
 };
 
 }  // namespace IPInterfaceProvider

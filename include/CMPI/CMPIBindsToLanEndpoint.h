@@ -11,8 +11,7 @@ namespace IPInterfaceProvider {
 
 class CMPIBindsToLanEndpoint : public CMPIAssociationAdapter<CMPIBindsToLanEndpoint, BindsToLANEndpoint,
                                                              CMPIProtocolEndpoint, CMPIIPLanEndPoint> {
-    using Base =
-        CMPIAssociationAdapter<CMPIBindsToLanEndpoint, BindsToLANEndpoint, CMPIProtocolEndpoint, CMPIIPLanEndPoint>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

@@ -7,18 +7,16 @@
 // the last one enumerated is.
 #pragma once
 
-#include <cmpidt.h>
-
 #include <string>
+
+#include "CMPI/CMPIAdapter.h"
 
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIIPComputerSystem {
+class CMPIIPComputerSystem : public CMPILookupAdapter {
 public:
     CMPIIPComputerSystem(const CMPIBroker* broker, const CMPIContext* context, std::string nameSpace);
-    CMPIIPComputerSystem(const CMPIIPComputerSystem&) = delete;
-    CMPIIPComputerSystem& operator=(const CMPIIPComputerSystem&) = delete;
 
     // Enumerates the path's class. Throws Nx::ProviderException when the broker cannot.
     void setObjectPath(const CMPIObjectPath* path, bool findServiceProcessor);
@@ -26,18 +24,8 @@ public:
     void findSP(CMPIEnumeration* enumeration, const CMPIObjectPath* path);
 
     explicit operator bool();
-    void operator++();
-    CMPIObjectPath* getObjectPath();
-    // The current system as fetched; properties is not applied.
-    CMPIInstance* getCMPIInstance(const char** properties);
 
 private:
-    const CMPIBroker* broker;
-    const CMPIContext* context;
-    std::string nameSpace;
-    CMPIInstance* instance;
-    CMPIEnumeration* enumeration;
-    bool initialLoad;
     bool findServiceProcessor;
 };
 

@@ -12,8 +12,7 @@ namespace IPInterfaceProvider {
 class CMPIIPElementCapabilities
     : public CMPIAssociationAdapter<CMPIIPElementCapabilities, IPElementCapabilities, CMPIProtocolEndpoint,
                                     CMPIIPEnabledLogicalElementCapabilities> {
-    using Base = CMPIAssociationAdapter<CMPIIPElementCapabilities, IPElementCapabilities, CMPIProtocolEndpoint,
-                                        CMPIIPEnabledLogicalElementCapabilities>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

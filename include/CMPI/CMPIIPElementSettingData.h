@@ -11,8 +11,7 @@ namespace IPInterfaceProvider {
 
 class CMPIIPElementSettingData : public CMPIAssociationAdapter<CMPIIPElementSettingData, IPElementSettingData,
                                                                CMPIProtocolEndpoint, CMPIAssignmentSettingData> {
-    using Base = CMPIAssociationAdapter<CMPIIPElementSettingData, IPElementSettingData, CMPIProtocolEndpoint,
-                                        CMPIAssignmentSettingData>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

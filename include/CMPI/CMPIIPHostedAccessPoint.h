@@ -11,8 +11,7 @@ namespace IPInterfaceProvider {
 
 class CMPIIPHostedAccessPoint : public CMPIAssociationAdapter<CMPIIPHostedAccessPoint, IPHostedAccessPoint,
                                                               CMPIIPComputerSystem, CMPIProtocolEndpoint> {
-    using Base = CMPIAssociationAdapter<CMPIIPHostedAccessPoint, IPHostedAccessPoint, CMPIIPComputerSystem,
-                                        CMPIProtocolEndpoint>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

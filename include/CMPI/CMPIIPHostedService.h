@@ -11,8 +11,7 @@ namespace IPInterfaceProvider {
 
 class CMPIIPHostedService : public CMPIAssociationAdapter<CMPIIPHostedService, IPHostedService, CMPIIPComputerSystem,
                                                           CMPIIPConfigurationService> {
-    using Base =
-        CMPIAssociationAdapter<CMPIIPHostedService, IPHostedService, CMPIIPComputerSystem, CMPIIPConfigurationService>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

@@ -4,18 +4,16 @@
 // many endpoints the enumeration holds.
 #pragma once
 
-#include <cmpidt.h>
-
 #include <string>
+
+#include "CMPI/CMPIAdapter.h"
 
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class CMPIIPLanEndPoint {
+class CMPIIPLanEndPoint : public CMPILookupAdapter {
 public:
     CMPIIPLanEndPoint(const CMPIBroker* broker, const CMPIContext* context, std::string nameSpace);
-    CMPIIPLanEndPoint(const CMPIIPLanEndPoint&) = delete;
-    CMPIIPLanEndPoint& operator=(const CMPIIPLanEndPoint&) = delete;
 
     // Fetches the one endpoint the path names. Throws Nx::ProviderException when the broker cannot.
     void setSingleObjectPath(const CMPIObjectPath* path);
@@ -23,17 +21,6 @@ public:
     void setObjectPath(const CMPIObjectPath* path);
 
     explicit operator bool();
-    void operator++();
-    CMPIObjectPath* getObjectPath();
-    CMPIInstance* getCMPIInstance(const char** properties);
-
-private:
-    const CMPIBroker* broker;
-    const CMPIContext* context;
-    std::string nameSpace;
-    CMPIInstance* instance;
-    CMPIEnumeration* enumeration;
-    bool initialLoad;
 };
 
 }  // namespace IPInterfaceProvider

@@ -12,8 +12,7 @@ namespace IPInterfaceProvider {
 class CMPIRemoteAccessAvailableToElement
     : public CMPIAssociationAdapter<CMPIRemoteAccessAvailableToElement, RemoteAccessAvailableToElement,
                                     CMPIRemoteServiceAccessPoint, CMPIProtocolEndpoint> {
-    using Base = CMPIAssociationAdapter<CMPIRemoteAccessAvailableToElement, RemoteAccessAvailableToElement,
-                                        CMPIRemoteServiceAccessPoint, CMPIProtocolEndpoint>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

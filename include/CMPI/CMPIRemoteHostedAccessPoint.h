@@ -11,8 +11,7 @@ namespace IPInterfaceProvider {
 
 class CMPIRemoteHostedAccessPoint : public CMPIAssociationAdapter<CMPIRemoteHostedAccessPoint, RemoteHostedAccessPoint,
                                                                   CMPIIPComputerSystem, CMPIRemoteServiceAccessPoint> {
-    using Base = CMPIAssociationAdapter<CMPIRemoteHostedAccessPoint, RemoteHostedAccessPoint, CMPIIPComputerSystem,
-                                        CMPIRemoteServiceAccessPoint>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

@@ -11,8 +11,7 @@ namespace IPInterfaceProvider {
 
 class CMPISPHostedAccessPoint : public CMPIAssociationAdapter<CMPISPHostedAccessPoint, SPHostedAccessPoint,
                                                               CMPIIPComputerSystem, CMPIProtocolEndpoint> {
-    using Base = CMPIAssociationAdapter<CMPISPHostedAccessPoint, SPHostedAccessPoint, CMPIIPComputerSystem,
-                                        CMPIProtocolEndpoint>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

@@ -11,8 +11,7 @@ namespace IPInterfaceProvider {
 
 class CMPIServiceAffectsElement : public CMPIAssociationAdapter<CMPIServiceAffectsElement, ServiceAffectsElement,
                                                                 CMPIProtocolEndpoint, CMPIIPConfigurationService> {
-    using Base = CMPIAssociationAdapter<CMPIServiceAffectsElement, ServiceAffectsElement, CMPIProtocolEndpoint,
-                                        CMPIIPConfigurationService>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

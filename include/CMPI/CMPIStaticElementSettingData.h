@@ -12,8 +12,7 @@ namespace IPInterfaceProvider {
 class CMPIStaticElementSettingData
     : public CMPIAssociationAdapter<CMPIStaticElementSettingData, StaticIPElementSettingData, CMPIProtocolEndpoint,
                                     CMPIStaticIPAssignmentSettingData> {
-    using Base = CMPIAssociationAdapter<CMPIStaticElementSettingData, StaticIPElementSettingData, CMPIProtocolEndpoint,
-                                        CMPIStaticIPAssignmentSettingData>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

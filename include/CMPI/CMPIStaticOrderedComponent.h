@@ -12,8 +12,7 @@ namespace IPInterfaceProvider {
 class CMPIStaticOrderedComponent
     : public CMPIAssociationAdapter<CMPIStaticOrderedComponent, StaticOrderedComponent, CMPIAssignmentSettingData,
                                     CMPIStaticIPAssignmentSettingData> {
-    using Base = CMPIAssociationAdapter<CMPIStaticOrderedComponent, StaticOrderedComponent, CMPIAssignmentSettingData,
-                                        CMPIStaticIPAssignmentSettingData>;
+    using Base = CMPIAssociationAdapter;
     friend Base;
 
 public:

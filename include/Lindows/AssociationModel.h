@@ -7,6 +7,7 @@
 #pragma once
 
 #include <string>
+#include <vector>
 
 #include "Lindows/IPprotocolEndpoint.h"
 #include "Nx/Exceptions.h"
@@ -36,6 +37,10 @@ Nx::Moniker computerSystemMoniker(Nx::Moniker& element, Nx::Instrumentation& cur
 // the name of the host's computer system.
 void requireHostComputer(const std::string& name);
 
+// The moniker of what the host's computer system hosts as a whole (its configuration service, its
+// gateways): {"SystemName" = the computer's Name}, which must be the host's.
+Nx::Moniker hostedByComputerMoniker(Nx::Moniker& computer);
+
 // The InstanceID prefix the setting models give the settings of a system: "BMC" for the service
 // processor, "Computer" otherwise.
 std::string settingPrefixOf(const std::string& systemName);
@@ -48,6 +53,29 @@ bool findEndpoint(IPprotocolEndpoint& endpoint, const std::string& name, const s
 // prefix names ("BMC": the service processor, any other: the host; null: either). False when
 // there is none.
 bool findEndpointOfSetting(IPprotocolEndpoint& endpoint, const std::string& name, const std::string* prefix);
+
+// The "%"-separated tokens of a setting's InstanceID. Raises Nx::FrameworkException: "Could not
+// find 'Name' key in Moniker" without an InstanceID, malformed with fewer than two tokens.
+std::vector<std::string> settingTokens(Nx::Moniker& setting, const char* malformed);
+
+// IsDefault and IsCurrent of a setting association: 0 (Unknown) until a setting has been resolved
+// against its endpoint, then 1 when it is the one in force there and 2 when not.
+class SettingInForce {
+public:
+    bool getIsDefault(unsigned short& isDefault);
+    bool getIsCurrent(unsigned short& isCurrent);
+    void setIsDefault(unsigned short isDefault);
+    void setIsCurrent(unsigned short isCurrent);
+
+protected:
+    // A setting of kind ("static", "dhcp") is in force when the endpoint's address origin is its
+    // kind. IsDefault and IsCurrent always move together.
+    void resolveAgainst(IPprotocolEndpoint& endpoint, const std::string& kind);
+
+private:
+    unsigned short IsDefault = 0;
+    unsigned short IsCurrent = 0;
+};
 
 // The endpoint keys every model adds for a located endpoint, in the usual order:
 // SystemCreationClassName, SystemName (when the endpoint can tell it), Name, CreationClassName.

@@ -14,13 +14,10 @@ struct IPAssignmentSettingDataKeys {
 };
 
 class IPAssignmentSettingData : public ModelPattern<IPAssignmentSettingData, IPAssignmentSettingDataKeys> {
-    using Base = ModelPattern<IPAssignmentSettingData, IPAssignmentSettingDataKeys>;
+    using Base = ModelPattern;
     friend Base;
 
 public:
-    using Filter = Base::Filter;
-    using FilterType = Base::FilterType;
-
     IPAssignmentSettingData();
 
     // With isCfg the filter selects both settings of the endpoint whose prefix and element name

@@ -14,13 +14,10 @@ struct IPConfigurationServiceKeys {
 };
 
 class IPConfigurationService : public ModelPattern<IPConfigurationService, IPConfigurationServiceKeys> {
-    using Base = ModelPattern<IPConfigurationService, IPConfigurationServiceKeys>;
+    using Base = ModelPattern;
     friend Base;
 
 public:
-    using Filter = Base::Filter;
-    using FilterType = Base::FilterType;
-
     IPConfigurationService();
 
     IPConfigurationService& operator++();

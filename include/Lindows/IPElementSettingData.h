@@ -1,16 +1,13 @@
 // KVRNX_IPElementSettingData: an IP endpoint and its two assignment settings (static and DHCP).
 #pragma once
 
-#include "Nx/Moniker.h"
+#include "Lindows/AssociationModel.h"
 
 namespace Nx {
 namespace IPInterfaceProvider {
 
-class IPElementSettingData {
+class IPElementSettingData : public SettingInForce {
 public:
-    IPElementSettingData();
-    ~IPElementSettingData();
-
     // Setting (InstanceID "prefix%interface%kind") to its endpoint. Also records whether the
     // setting is the one in force on the endpoint (IsDefault and IsCurrent).
     Nx::Moniker getManagedElementMoniker(Nx::Moniker& setting);
@@ -18,15 +15,7 @@ public:
     // ("prefix%interface") when given to the assignment setting adapter loosely.
     Nx::Moniker getIPSettingDataMoniker(Nx::Moniker& endpoint);
 
-    bool getIsDefault(unsigned short& isDefault);
-    bool getIsCurrent(unsigned short& isCurrent);
     bool getIsNext(unsigned short& isNext);
-    void setIsDefault(unsigned short isDefault);
-    void setIsCurrent(unsigned short isCurrent);
-
-private:
-    unsigned short IsDefault;
-    unsigned short IsCurrent;
 };
 
 }  // namespace IPInterfaceProvider

@@ -15,13 +15,10 @@ struct IPEnabledLogicalElementCapabilitiesKeys {
 
 class IPEnabledLogicalElementCapabilities
     : public ModelPattern<IPEnabledLogicalElementCapabilities, IPEnabledLogicalElementCapabilitiesKeys> {
-    using Base = ModelPattern<IPEnabledLogicalElementCapabilities, IPEnabledLogicalElementCapabilitiesKeys>;
+    using Base = ModelPattern;
     friend Base;
 
 public:
-    using Filter = Base::Filter;
-    using FilterType = Base::FilterType;
-
     IPEnabledLogicalElementCapabilities();
 
     bool getInstanceID(std::string& instanceID);

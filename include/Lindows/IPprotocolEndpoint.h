@@ -13,13 +13,10 @@ struct IPprotocolEndpointKeys {
 };
 
 class IPprotocolEndpoint : public ModelPattern<IPprotocolEndpoint, IPprotocolEndpointKeys> {
-    using Base = ModelPattern<IPprotocolEndpoint, IPprotocolEndpointKeys>;
+    using Base = ModelPattern;
     friend Base;
 
 public:
-    using Filter = Base::Filter;
-    using FilterType = Base::FilterType;
-
     IPprotocolEndpoint();
 
     bool getName(std::string& name);

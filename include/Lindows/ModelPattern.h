@@ -14,6 +14,7 @@
 #pragma once
 
 #include <string>
+#include <type_traits>
 #include <vector>
 
 #include "Nx/Instrumentation.h"
@@ -23,6 +24,17 @@
 
 namespace Nx {
 namespace IPInterfaceProvider {
+
+// Where a model's function stands, so that a shared helper traces its lines as that function's.
+struct Site {
+    const char* function;
+    const char* file;
+    int line;
+};
+#define NX_SITE (::Nx::IPInterfaceProvider::Site{__func__, NX_FILE, __LINE__})
+
+// The host name from gethostname. False when gethostname fails.
+bool localHostName(std::string& name);
 
 template <class Derived, class Keys, Nx::NodeLexicon::NodeType NodeTypeV = Nx::NodeLexicon::IPEndpointNode>
 class ModelPattern : public Keys {
@@ -46,11 +58,64 @@ public:
 
 protected:
     ModelPattern() : filterSet(false) { instrumentation.selectNode(NodeTypeV); }
+    // Traces the derived constructor at (ENTERING, EXITING).
+    explicit ModelPattern(const Site& at) : ModelPattern() {
+        traced(at, [] { return true; });
+    }
     ModelPattern(const ModelPattern&) = default;
     ModelPattern& operator=(const ModelPattern&) = default;
     ~ModelPattern() = default;
 
     void advance() { ++instrumentation; }
+
+    // A getter's work, traced as the getter at: its ENTERING and EXITING lines (level 4000)
+    // around body, whose answer it returns.
+    template <class Body>
+    static bool traced(const Site& at, Body body) {
+        record(at, 4000, trace(at.file, at.function, at.line, ENTERING));
+        const bool answered = body();
+        record(at, 4000, trace(at.file, at.function, at.line, EXITING));
+        return answered;
+    }
+    static void record(const Site& at, int level, const char* text) {
+        logRecord(Derived::logger(), at.function, at.file, at.line, level, text);
+    }
+    // A getter of a fixed value.
+    template <class Value, class Fixed>
+    static bool fixed(const Site& at, Value& value, const Fixed& fixedValue) {
+        return traced(at, [&] {
+            value = fixedValue;
+            return true;
+        });
+    }
+    // A getter of a property of the current node, narrowed from the number the host keeps when
+    // the getter's type is narrower. False, value untouched, when the host has none.
+    template <class Value>
+    bool readProperty(const Site& at, Nx::NodeLexicon::Properties property, Value& value) {
+        return traced(at, [&] {
+            if constexpr (std::is_same_v<Value, unsigned short>) {
+                unsigned int code = 0;
+                if (!instrumentation.getProperty(property, code)) return false;
+                value = static_cast<unsigned short>(code);
+                return true;
+            } else {
+                return instrumentation.getProperty(property, value);
+            }
+        });
+    }
+    // getSystemName: the service processor's name on it, the host name elsewhere; false when
+    // gethostname fails.
+    static bool systemName(const Site& at, bool onServiceProcessor, std::string& name) {
+        return traced(at, [&] {
+            if (onServiceProcessor) {
+                name = "BMC:-1";
+                return true;
+            }
+            if (localHostName(name)) return true;
+            record(at, 6000, trace(at.file, "gethostname Failed", at.line, FREE_MESSAGE));
+            return false;
+        });
+    }
 
     bool filterSet;
     std::vector<Filter> filters;
@@ -117,9 +182,6 @@ void ModelPattern<Derived, Keys, NodeTypeV>::initialize() {
 // The grandparent of the cursor's node is the service processor (its description is exactly
 // "BMC"). The cursor itself does not move.
 bool isUnderServiceProcessor(const Nx::Instrumentation& cursor);
-
-// The host name from gethostname. False when gethostname fails.
-bool localHostName(std::string& name);
 
 }  // namespace IPInterfaceProvider
 }  // namespace Nx

@@ -14,13 +14,10 @@ struct RemoteServiceAccessPointKeys {
 };
 
 class RemoteServiceAccessPoint : public ModelPattern<RemoteServiceAccessPoint, RemoteServiceAccessPointKeys> {
-    using Base = ModelPattern<RemoteServiceAccessPoint, RemoteServiceAccessPointKeys>;
+    using Base = ModelPattern;
     friend Base;
 
 public:
-    using Filter = Base::Filter;
-    using FilterType = Base::FilterType;
-
     // Stands on the first endpoint that has a gateway.
     RemoteServiceAccessPoint();
 

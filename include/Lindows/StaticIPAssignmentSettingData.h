@@ -16,13 +16,10 @@ struct StaticIPAssignmentSettingDataKeys {
 
 class StaticIPAssignmentSettingData
     : public ModelPattern<StaticIPAssignmentSettingData, StaticIPAssignmentSettingDataKeys> {
-    using Base = ModelPattern<StaticIPAssignmentSettingData, StaticIPAssignmentSettingDataKeys>;
+    using Base = ModelPattern;
     friend Base;
 
 public:
-    using Filter = Base::Filter;
-    using FilterType = Base::FilterType;
-
     StaticIPAssignmentSettingData();
 
     bool getInstanceID(std::string& instanceID);
@@ -54,9 +51,10 @@ private:
     bool filterHolds(const Filter& filter);
     // The file path of the current interface; false when it has none we may use.
     bool filePath(std::string& path);
-    // The key's value from the file, or (when the interface has no file) the node property.
-    void readSetting(const char* key, Nx::NodeLexicon::Properties fallback, std::string& value);
-    void writeSetting(const char* key, const std::string& value);
+    // The getters and setters of the file's keys, traced as at; true. A read falls back on the
+    // node property while the interface has no file; a write then goes nowhere.
+    bool readSetting(const Site& at, const char* key, Nx::NodeLexicon::Properties fallback, std::string& value);
+    bool writeSetting(const Site& at, const char* key, const std::string& value);
 };
 
 }  // namespace IPInterfaceProvider
