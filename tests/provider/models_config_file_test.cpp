@@ -1,7 +1,10 @@
 // Rewriting KEY=value configuration files.
 #include <gtest/gtest.h>
 #include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
+#include <algorithm>
 #include <string>
 #include <thread>
 #include <vector>
@@ -65,18 +68,41 @@ TEST_F(ConfigurationFileTest, RefusesUnsafeKeysAndValuesAndWritesNothing) {
 }
 
 TEST_F(ConfigurationFileTest, ConcurrentWritersLoseNoUpdate) {
+    // Two forked processes and this one, three threads each, rewrite one file at once.
     writeFile(file, "DEVICE=eth0\n");
-    const auto key = [](int t, int k) { return "K" + std::to_string(t) + "X" + std::to_string(k); };
-    std::vector<std::thread> writers;
-    for (int t = 0; t < 6; ++t)
-        writers.emplace_back([&, t] {
-            for (int k = 0; k < 15; ++k) modifyValue(file, key(t, k), std::to_string(k));
-        });
-    for (std::thread& writer : writers) writer.join();
+    const auto key = [](int p, int t, int k) {
+        return "P" + std::to_string(p) + "T" + std::to_string(t) + "K" + std::to_string(k);
+    };
+    const auto hammer = [&](int p) {
+        std::vector<std::thread> writers;
+        for (int t = 0; t < 3; ++t)
+            writers.emplace_back([&, t] {
+                for (int k = 0; k < 10; ++k) modifyValue(file, key(p, t, k), std::to_string(k));
+            });
+        for (std::thread& writer : writers) writer.join();
+    };
+    std::vector<pid_t> children;
+    for (int p = 1; p <= 2; ++p) {
+        const pid_t child = ::fork();
+        ASSERT_GE(child, 0);
+        if (child == 0) {
+            hammer(p);
+            ::_exit(0);
+        }
+        children.push_back(child);
+    }
+    hammer(0);
+    for (pid_t child : children) {
+        int status = 0;
+        ASSERT_EQ(::waitpid(child, &status, 0), child);
+        EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0);
+    }
     const std::string content = readFile(file);
-    for (int t = 0; t < 6; ++t)
-        for (int k = 0; k < 15; ++k)
-            EXPECT_NE(content.find(key(t, k) + "=" + std::to_string(k) + "\n"), std::string::npos) << key(t, k);
+    EXPECT_EQ(std::count(content.begin(), content.end(), '\n'), 1 + 3 * 3 * 10);  // nothing torn or doubled
+    for (int p = 0; p <= 2; ++p)
+        for (int t = 0; t < 3; ++t)
+            for (int k = 0; k < 10; ++k)
+                EXPECT_NE(content.find(key(p, t, k) + "=" + std::to_string(k) + "\n"), std::string::npos);
 }
 
 TEST_F(ConfigurationFileTest, PathsFitTheBufferOrAreRefused) {
