@@ -57,12 +57,12 @@ void applyHostSettings(const IP_CONFIG_DATA* cfg_data) {
     if (!cfg_data->dnsServers.empty()) {
         NX_VAR(loggerApplyConfiguration, "cfg_data->dnsServers.size()",
                static_cast<unsigned>(cfg_data->dnsServers.size()));
-        system.setProperty(NodeLexicon::DNSServers, std::vector<std::string>(cfg_data->dnsServers));
+        system.setProperty(NodeLexicon::DNSServers, cfg_data->dnsServers);
     }
     if (!cfg_data->dnsSuffixes.empty()) {
         NX_VAR(loggerApplyConfiguration, "cfg_data->dnsSuffixes.size()",
                static_cast<unsigned>(cfg_data->dnsSuffixes.size()));
-        system.setProperty(NodeLexicon::DNSSuffixes, std::vector<std::string>(cfg_data->dnsSuffixes));
+        system.setProperty(NodeLexicon::DNSSuffixes, cfg_data->dnsSuffixes);
     }
     std::string hostName;
     if (system.getProperty(NodeLexicon::HostName, hostName) && !cfg_data->dnsHostName.empty() &&

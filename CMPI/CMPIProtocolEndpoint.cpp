@@ -121,8 +121,7 @@ CMPIUint32 CMPIProtocolEndpoint::executeMethod(const CMPIArgs* in, CMPIArgs* out
     if (!model.setEnabledState(state)) return refuse(CMPI_RC_ERR_FAILED, "Invalid Type of TimeOut Parameter");
 
     NX_MESSAGE(loggerCMPIProtocolEndpoint, 3000, "Calling CMNewObjectPath for ConcreteJob");
-    if (!returnJob(out)) return 0;
-    NX_MESSAGE(loggerCMPIProtocolEndpoint, 3000, "Job Created Successfully");
+    if (returnJob(out)) NX_MESSAGE(loggerCMPIProtocolEndpoint, 3000, "Job Created Successfully");
     return 0;
 }
 

@@ -41,13 +41,14 @@ Nx::Moniker IPElementSettingData::getIPSettingDataMoniker(Nx::Moniker& endpoint)
     // Both settings of an interface share everything up to their last "%".
     IPAssignmentSettingData setting;
     std::string found;
-    for (; setting && found.empty(); ++setting) {
+    for (; setting; ++setting) {
         std::string elementName, instanceId;
         setting.getElementName(elementName);
+        if (elementName != name) continue;
         setting.getInstanceId(instanceId);
-        if (elementName != name || (systemGiven && instanceId.compare(0, wantedPrefix.size(), wantedPrefix) != 0))
-            continue;
+        if (systemGiven && instanceId.compare(0, wantedPrefix.size(), wantedPrefix) != 0) continue;
         found = instanceId.substr(0, instanceId.rfind('%'));
+        break;
     }
     if (found.empty()) throw Nx::FrameworkException("Could not get 'Instance ID' key");
     NX_VAR(loggerIPElementSettingData, "InstanceID", found.c_str());

@@ -1,14 +1,12 @@
 #include "ipif/Mof.h"
 
-#include <dirent.h>
-#include <sys/stat.h>
-
 #include <algorithm>
 #include <cctype>
-#include <fstream>
 #include <functional>
 #include <set>
 #include <sstream>
+
+#include "TextFiles.h"
 
 namespace ipif {
 
@@ -407,14 +405,6 @@ private:
     Token tok_;
 };
 
-std::string readFile(const std::string& path) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) throw MofError(path + ":0: cannot open file");
-    std::ostringstream ss;
-    ss << in.rdbuf();
-    return ss.str();
-}
-
 }  // namespace
 
 const ParameterDecl* MethodDecl::parameter(const std::string& n) const {
@@ -467,24 +457,15 @@ void ClassRepository::addText(const std::string& text, const std::string& fileNa
     d_->isResolved = false;
 }
 
-void ClassRepository::addFile(const std::string& path) { addText(readFile(path), path); }
+void ClassRepository::addFile(const std::string& path) {
+    std::string text;
+    if (!detail::readFile(path, text)) throw MofError(path + ":0: cannot open file");
+    addText(text, path);
+}
 
 void ClassRepository::addPath(const std::string& path) {
-    struct stat st {};
-    if (stat(path.c_str(), &st) != 0) throw MofError(path + ":0: no such file or directory");
-    if (!S_ISDIR(st.st_mode)) {
-        addFile(path);
-        return;
-    }
     std::vector<std::string> files;
-    if (DIR* dir = opendir(path.c_str())) {
-        while (dirent* e = readdir(dir)) {
-            std::string n = e->d_name;
-            if (n.size() > 4 && lower(n.substr(n.size() - 4)) == ".mof") files.push_back(path + "/" + n);
-        }
-        closedir(dir);
-    }
-    std::sort(files.begin(), files.end());
+    if (!detail::filesAt(path, ".mof", true, files)) throw MofError(path + ":0: no such file or directory");
     for (const auto& f : files) addFile(f);
 }
 

@@ -1,25 +1,14 @@
 #include "ipif/Registration.h"
 
-#include <dirent.h>
-#include <sys/stat.h>
-
-#include <algorithm>
-#include <cctype>
-#include <fstream>
 #include <sstream>
 
-#include "ipif/Value.h"
+#include "TextFiles.h"
 
 namespace ipif {
 
 namespace {
 
-std::string trim(const std::string& s) {
-    std::size_t b = 0, e = s.size();
-    while (b < e && std::isspace(static_cast<unsigned char>(s[b]))) ++b;
-    while (e > b && std::isspace(static_cast<unsigned char>(s[e - 1]))) --e;
-    return s.substr(b, e - b);
-}
+using detail::trim;
 
 std::vector<std::string> words(const std::string& s) {
     std::istringstream in(s);
@@ -104,28 +93,14 @@ std::vector<Registration> parseRegistrations(const std::string& text, const std:
 }
 
 std::vector<Registration> loadRegistrations(const std::string& path) {
-    struct stat st {};
-    if (stat(path.c_str(), &st) != 0) throw RegistrationError(path + ":0: no such file or directory");
     std::vector<std::string> files;
-    if (S_ISDIR(st.st_mode)) {
-        if (DIR* dir = opendir(path.c_str())) {
-            while (dirent* e = readdir(dir)) {
-                std::string n = e->d_name;
-                if (n.size() > 4 && n.compare(n.size() - 4, 4, ".reg") == 0) files.push_back(path + "/" + n);
-            }
-            closedir(dir);
-        }
-        std::sort(files.begin(), files.end());
-    } else {
-        files.push_back(path);
-    }
+    if (!detail::filesAt(path, ".reg", false, files))
+        throw RegistrationError(path + ":0: no such file or directory");
     std::vector<Registration> all;
     for (const auto& f : files) {
-        std::ifstream in(f, std::ios::binary);
-        if (!in) throw RegistrationError(f + ":0: cannot open file");
-        std::ostringstream ss;
-        ss << in.rdbuf();
-        auto regs = parseRegistrations(ss.str(), f);
+        std::string text;
+        if (!detail::readFile(f, text)) throw RegistrationError(f + ":0: cannot open file");
+        auto regs = parseRegistrations(text, f);
         all.insert(all.end(), regs.begin(), regs.end());
     }
     return all;

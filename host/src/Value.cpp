@@ -9,6 +9,8 @@
 #include <cstring>
 #include <limits>
 
+#include "TextFiles.h"
+
 namespace ipif {
 
 namespace {
@@ -115,12 +117,7 @@ bool elementsEqual(const Element& a, const Element& b) {
     }
 }
 
-std::string trim(const std::string& s) {
-    std::size_t b = 0, e = s.size();
-    while (b < e && std::isspace(static_cast<unsigned char>(s[b]))) ++b;
-    while (e > b && std::isspace(static_cast<unsigned char>(s[e - 1]))) --e;
-    return s.substr(b, e - b);
-}
+using detail::trim;
 
 // Removes surrounding double quotes and resolves backslash escapes; text without quotes is
 // returned as it is.

@@ -3,11 +3,12 @@
 #include <cerrno>
 #include <cstring>
 #include <dirent.h>
-#include <fstream>
 #include <sstream>
 #include <sys/inotify.h>
 #include <sys/stat.h>
 #include <unistd.h>
+
+#include "Nx/File.h"
 
 namespace Nx {
 namespace Live {
@@ -55,15 +56,6 @@ std::string assignedKey(const std::string& line) {
 bool isOwnedResolverLine(const std::string& line) {
     const std::vector<std::string> w = words(line);
     return !w.empty() && (w[0] == "nameserver" || w[0] == "search" || w[0] == "domain");
-}
-
-bool readSmallFile(const std::string& path, std::string& content) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) return false;
-    std::ostringstream buffer;
-    buffer << in.rdbuf();
-    content = buffer.str();
-    return true;
 }
 
 }  // namespace
@@ -155,7 +147,7 @@ std::map<std::string, std::string> readBootProtocols(const std::string& director
         const std::string name = entry->d_name;
         if (name.compare(0, 6, "ifcfg-") != 0 || name.size() == 6) continue;
         std::string content;
-        if (!readSmallFile(directory + "/" + name, content)) continue;
+        if (!File::read(directory + "/" + name, content)) continue;
         const std::map<std::string, std::string> values = parseAssignments(content);
         const auto found = values.find("BOOTPROTO");
         if (found != values.end()) result[name.substr(6)] = found->second;

@@ -104,11 +104,9 @@ public:
     bool write(const std::string& nodePath, unsigned int property, const PropertyValue& value) override {
         std::lock_guard<std::mutex> lock(mutex_);
         const std::shared_ptr<const Tree> tree = current();
-        const Node* node = nullptr;
-        for (const Node& candidate : tree->nodes) {
-            if (candidate.path == nodePath) node = &candidate;
-        }
-        if (!node) return false;
+        const int index = tree->find(nodePath);
+        if (index < 0) return false;
+        const Node* node = &tree->nodes[static_cast<size_t>(index)];
         const PropertyValue* known = findProperty(*node, property);
         if (!known || known->readOnly || known->kind != value.kind || !isSafe(value)) return false;
 

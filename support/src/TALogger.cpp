@@ -5,6 +5,7 @@
 #include <syslog.h>
 #include <unistd.h>
 
+#include <atomic>
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
@@ -70,10 +71,28 @@ std::shared_ptr<const Config> readEnvironment() {
 
 std::mutex configMutex;
 std::shared_ptr<const Config> configuration;
+// configuration->threshold, readable without the lock: most records fall below it and are
+// dropped without touching the mutex.
+std::atomic<int> activeThreshold{kDefaultThreshold};
+std::once_flag loaded;
+
+void install(std::shared_ptr<const Config> fresh) {
+    std::lock_guard<std::mutex> lock(configMutex);
+    activeThreshold.store(fresh->threshold, std::memory_order_relaxed);
+    configuration = std::move(fresh);
+}
+
+void loadOnce() {
+    std::call_once(loaded, [] { install(readEnvironment()); });
+}
+
+bool dropped(int level) {
+    loadOnce();
+    return level < activeThreshold.load(std::memory_order_relaxed);
+}
 
 std::shared_ptr<const Config> currentConfig() {
     std::lock_guard<std::mutex> lock(configMutex);
-    if (!configuration) configuration = readEnvironment();
     return configuration;
 }
 
@@ -103,6 +122,7 @@ void toSyslog(int level, const std::string& line) {
 void TALogger::logLevelMessage(const char* /*function*/, const char* /*file*/, int /*line*/,
                                const std::string& /*component*/, int level, const char*, int, int,
                                const char* text) {
+    if (dropped(level)) return;
     auto config = currentConfig();
     if (level < config->threshold) return;
     std::string line = oneLine(text);
@@ -116,6 +136,7 @@ void TALogger::logLevelMessage(const char* /*function*/, const char* /*file*/, i
 
 void TALogger::traceLevelMessage(const char* function, const char* file, int line, const std::string& component,
                                  int level, const char*, int, int, const char* text) {
+    if (dropped(level)) return;
     auto config = currentConfig();
     if (level < config->threshold || !config->traceFile) return;
     char head[256];
@@ -129,9 +150,8 @@ void TALogger::traceLevelMessage(const char* function, const char* file, int lin
 }
 
 void TALogger::reconfigure() {
-    auto fresh = readEnvironment();
-    std::lock_guard<std::mutex> lock(configMutex);
-    configuration = std::move(fresh);
+    loadOnce();
+    install(readEnvironment());
 }
 
 }  // namespace TALog

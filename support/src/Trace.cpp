@@ -1,7 +1,6 @@
 #include "Trace.h"
 
 #include <cstdio>
-#include <cstring>
 
 namespace Nx {
 namespace {
@@ -23,21 +22,19 @@ static_assert(sizeof("==========================================================
 }  // namespace
 
 const char* trace(const char* name, const char* file, int line, const char* value) {
-    std::memset(variableTextBuffer, 0, kBufferSize);
     std::snprintf(variableTextBuffer, kBufferSize, "VARIABLE: '%s' has Value '%s' at line %d in %s", orNull(name),
                   orNull(value), line, orNull(file));
     return variableTextBuffer;
 }
 
 const char* trace(const char* name, const char* file, int line, unsigned value) {
-    std::memset(variableNumberBuffer, 0, kBufferSize);
     std::snprintf(variableNumberBuffer, kBufferSize, "VARIABLE: '%s' has Value '%d' at line %d in %s", orNull(name),
                   static_cast<int>(value), line, orNull(file));
     return variableNumberBuffer;
 }
 
 const char* trace(const char* file, const char* function, int line, MessageType type) {
-    std::memset(messageBuffer, 0, kBufferSize);
+    messageBuffer[0] = '\0';  // an unknown type yields empty text
     switch (type) {
         case ENTERING:
             std::snprintf(messageBuffer, kBufferSize, "ENTERING: %s() in %s [Line: %d]", orNull(function),
@@ -63,7 +60,7 @@ const char* trace(const char* file, const char* function, int line, MessageType 
 }
 
 const char* tracepara(const char* file, const char* function, int line, const char* parameters, MessageType type) {
-    std::memset(parameterBuffer, 0, kBufferSize);
+    parameterBuffer[0] = '\0';  // an unknown type yields empty text
     switch (type) {
         case ENTERING:
             std::snprintf(parameterBuffer, kBufferSize, "ENTERING: %s() in %s [Line: %d],Parameters List: %s",
