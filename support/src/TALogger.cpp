@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <sys/syscall.h>
 #include <syslog.h>
+#include <time.h>
 #include <unistd.h>
 
 #include <atomic>
@@ -50,6 +51,7 @@ private:
 
 struct Config {
     int threshold = kDefaultThreshold;
+    std::string error;                      // what was wrong with the environment, if anything
     std::unique_ptr<AppendFile> logFile;    // null: syslog
     std::unique_ptr<AppendFile> traceFile;  // null: trace records are dropped
 };
@@ -60,8 +62,15 @@ std::shared_ptr<const Config> readEnvironment() {
         char* end = nullptr;
         errno = 0;
         long value = std::strtol(level, &end, 10);
-        if (errno == 0 && end && *end == '\0' && value >= -1000000 && value <= 1000000)
+        if (errno == 0 && end != level && *end == '\0' && value >= 0 && value <= 1000000) {
             config->threshold = static_cast<int>(value);
+        } else {
+            std::string shown;
+            for (const char* c = level; *c && shown.size() < 40; ++c)
+                shown += (static_cast<unsigned char>(*c) < 0x20 || *c == 0x7f) ? '?' : *c;
+            config->error = "IPIF_LOG_LEVEL=\"" + shown + "\" is not a level (a whole number from 0 to 1000000); using " +
+                            std::to_string(kDefaultThreshold);
+        }
     }
     if (const char* path = std::getenv("IPIF_LOG_FILE"); path && *path) config->logFile = std::make_unique<AppendFile>(path);
     if (const char* path = std::getenv("IPIF_TRACE_FILE"); path && *path)
@@ -76,7 +85,10 @@ std::shared_ptr<const Config> configuration;
 std::atomic<int> activeThreshold{kDefaultThreshold};
 std::once_flag loaded;
 
+void reportConfigurationError(const Config& config);
+
 void install(std::shared_ptr<const Config> fresh) {
+    reportConfigurationError(*fresh);
     std::lock_guard<std::mutex> lock(configMutex);
     activeThreshold.store(fresh->threshold, std::memory_order_relaxed);
     configuration = std::move(fresh);
@@ -111,10 +123,39 @@ int syslogPriority(int level) {
     return LOG_DEBUG;
 }
 
+const char* levelName(int level) {
+    if (level >= 6000) return "ERROR";
+    if (level >= 5000) return "WARNING";
+    if (level >= 4000) return "INFO";
+    return "DEBUG";
+}
+
+// No openlog(): inside an object manager that would re-tag every later syslog line of the host
+// process. The host's own ident stays; our records say where they come from.
 void toSyslog(int level, const std::string& line) {
-    static std::once_flag opened;
-    std::call_once(opened, [] { ::openlog("ipif", LOG_PID | LOG_NDELAY, LOG_DAEMON); });
-    ::syslog(syslogPriority(level), "%s", line.c_str());
+    ::syslog(LOG_DAEMON | syslogPriority(level), "IPInterfaceProvider: %s", line.c_str());
+}
+
+// "2026-11-23T10:15:02.123Z ERROR 4711 " : when, how bad, which process.
+std::string fileLinePrefix(int level) {
+    struct timespec now {};
+    ::clock_gettime(CLOCK_REALTIME, &now);
+    struct tm utc {};
+    ::gmtime_r(&now.tv_sec, &utc);
+    char head[96];
+    size_t n = std::strftime(head, sizeof head, "%Y-%m-%dT%H:%M:%S", &utc);
+    std::snprintf(head + n, sizeof head - n, ".%03ldZ %s %ld ", static_cast<long>(now.tv_nsec / 1000000),
+                  levelName(level), static_cast<long>(::getpid()));
+    return head;
+}
+
+// A bad environment is reported once per configuration, whatever the threshold.
+void reportConfigurationError(const Config& config) {
+    if (config.error.empty()) return;
+    if (config.logFile)
+        config.logFile->writeLine(fileLinePrefix(6000) + config.error + "\n");
+    else
+        toSyslog(6000, config.error);
 }
 
 }  // namespace
@@ -125,12 +166,13 @@ void TALogger::logLevelMessage(const char* /*function*/, const char* /*file*/, i
     if (dropped(level)) return;
     auto config = currentConfig();
     if (level < config->threshold) return;
-    std::string line = oneLine(text);
     if (config->logFile) {
+        std::string line = fileLinePrefix(level);
+        line += oneLine(text);
         line += '\n';
         config->logFile->writeLine(line);
     } else {
-        toSyslog(level, line);
+        toSyslog(level, oneLine(text));
     }
 }
 
@@ -152,6 +194,11 @@ void TALogger::traceLevelMessage(const char* function, const char* file, int lin
 void TALogger::reconfigure() {
     loadOnce();
     install(readEnvironment());
+}
+
+std::string TALogger::configurationError() {
+    loadOnce();
+    return currentConfig()->error;
 }
 
 }  // namespace TALog

@@ -80,4 +80,20 @@ inline std::string readFile(const std::string& path) {
 
 inline bool fileExists(const std::string& path) { return std::filesystem::exists(path); }
 
+// The texts of a log file's records, one per line, without the "<time> <level> <pid> " head.
+inline std::string readLogTexts(const std::string& path) {
+    std::istringstream in(readFile(path));
+    std::string texts;
+    for (std::string line; std::getline(in, line);) {
+        size_t at = 0;
+        for (int field = 0; field < 3 && at != std::string::npos; ++field) {
+            at = line.find(' ', at);
+            if (at != std::string::npos) ++at;
+        }
+        if (at == std::string::npos) throw std::runtime_error("log line without its head: " + line);
+        texts += line.substr(at) + "\n";
+    }
+    return texts;
+}
+
 }  // namespace testfiles

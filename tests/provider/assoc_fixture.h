@@ -114,12 +114,12 @@ protected:
     }
 
     size_t logged(const std::string& text) const {
-        const std::string all = testfiles::readFile(scratch.file("log"));
+        const std::string all = log();
         size_t count = 0;
         for (size_t at = all.find(text); at != std::string::npos; at = all.find(text, at + 1)) ++count;
         return count;
     }
-    std::string log() const { return testfiles::readFile(scratch.file("log")); }
+    std::string log() const { return testfiles::readLogTexts(scratch.file("log")); }
 
     testfiles::ScratchDir scratch;
     const std::string model = scratch.file("host.model");

@@ -14,6 +14,7 @@
 #include <string>
 #include <vector>
 
+#include "TestFiles.h"
 #include "ipif/Host.h"
 
 namespace fs = std::filesystem;
@@ -184,13 +185,13 @@ TEST_F(ProviderRequests, GetWhoseKeysMatchNothingSucceedsEmpty) {
 
 TEST_F(ProviderRequests, LogShowsTheMarkersAndVariablesOfARequest) {
     ASSERT_TRUE(host().enumerateInstanceNames("root/cimv2", "KVRNX_IPProtocolEndpoint").ok());
-    const std::vector<std::string> log = lines(slurp(log_));
+    const std::vector<std::string> log = lines(testfiles::readLogTexts(log_));
     const std::string separator(78, '=');
     // The first records of the request: separator, entry marker, the class id.
     auto entry = std::find_if(log.begin(), log.end(), [](const std::string& l) {
         return l.rfind("ENTERING: IPInterface_EnumInstanceNames() in IPInterfaceProvider.cpp [Line: ", 0) == 0;
     });
-    ASSERT_NE(entry, log.end()) << slurp(log_);
+    ASSERT_NE(entry, log.end()) << testfiles::readLogTexts(log_);
     ASSERT_NE(entry, log.begin());
     EXPECT_EQ(*(entry - 1), separator);
     ASSERT_NE(entry + 1, log.end());
@@ -204,9 +205,9 @@ TEST_F(ProviderRequests, LogShowsTheMarkersAndVariablesOfARequest) {
     ASSERT_NE(exit + 1, log.end());
     EXPECT_EQ(*(exit + 1), separator);
     // Delete writes a single METHOD line and no markers.
-    const size_t before = lines(slurp(log_)).size();
+    const size_t before = lines(testfiles::readLogTexts(log_)).size();
     host().deleteInstance(path("KVRNX_IPProtocolEndpoint"));
-    const std::vector<std::string> after = lines(slurp(log_));
+    const std::vector<std::string> after = lines(testfiles::readLogTexts(log_));
     ASSERT_EQ(after.size(), before + 1);
     EXPECT_EQ(after.back().rfind("METHOD: IPInterface_DeleteInstance() was invoked in IPInterfaceProvider.cpp [Line: ", 0),
               0u);
@@ -233,7 +234,7 @@ TEST_F(ProviderRequests, AnExceptionInAModelEndsTheEnumerationWithWhatWasProduce
     EXPECT_EQ(r.rc, CMPI_RC_OK);
     EXPECT_EQ(r.instances.size(), 1u);
     EXPECT_FALSE(r.done);  // no end-of-results signal after an exception
-    const std::string log = slurp(log_);
+    const std::string log = testfiles::readLogTexts(log_);
     EXPECT_NE(log.find("MESSAGE [File: IPInterfaceProvider.cpp, Line: "), std::string::npos);
     EXPECT_NE(log.find("could not be read from the host"), std::string::npos);
 }

@@ -1,11 +1,18 @@
+#include <sched.h>
+#include <sys/mount.h>
+#include <sys/socket.h>
+#include <sys/un.h>
 #include <sys/wait.h>
+#include <syslog.h>
 #include <unistd.h>
 
 #include <cstring>
 #include <map>
+#include <regex>
 #include <thread>
 
 #include "SupportTestUtil.h"
+#include "TestFiles.h"
 #include "Trace.h"
 
 using namespace supporttest;
@@ -33,7 +40,8 @@ public:
           traceEnv_("IPIF_TRACE_FILE", trace_), levelEnv_("IPIF_LOG_LEVEL", level) {
         TALog::TALogger::reconfigure();
     }
-    std::string log() const { return slurp(log_); }
+    std::string log() const { return testfiles::readLogTexts(log_); }
+    std::string rawLog() const { return slurp(log_); }
     std::string trace() const { return slurp(trace_); }
 
 private:
@@ -137,12 +145,17 @@ TEST(Logging, ProviderMarkersByteForByte) {
 }
 
 TEST(Logging, ThresholdRoutesByLevel) {
-    {
-        LogFiles files("bogus");  // unparsable: the default threshold 6000 holds
+    for (const char* bogus : {"bogus", "4000x", "-1", "99999999999", " "}) {
+        // Not a level: said once as an error, and the default threshold 6000 holds.
+        LogFiles files(bogus);
+        EXPECT_NE(TALog::TALogger::configurationError().find("IPIF_LOG_LEVEL"), std::string::npos) << bogus;
         Nx::logRecord(kComponent, "f", "F.cpp", 1, 3000, "entry");
         Nx::logRecord(kComponent, "f", "F.cpp", 2, 4000, "variable");
         Nx::logRecord(kComponent, "f", "F.cpp", 3, 6000, "failure\nforged record");
-        EXPECT_EQ(files.log(), "failure forged record\n");
+        auto logged = lines(files.log());
+        ASSERT_EQ(logged.size(), 2u) << bogus;
+        EXPECT_EQ(logged[0].rfind("IPIF_LOG_LEVEL=\"", 0), 0u) << logged[0];
+        EXPECT_EQ(logged[1], "failure forged record");
         EXPECT_EQ(lines(files.trace()).size(), 1u);
     }
     {
@@ -151,7 +164,70 @@ TEST(Logging, ThresholdRoutesByLevel) {
         Nx::logRecord(kComponent, "f", "F.cpp", 1, 3000, "entry");
         Nx::logRecord(kComponent, "f", "F.cpp", 1, 6000, "failure");
         EXPECT_EQ(files.log(), "entry\nfailure\n");
+        EXPECT_EQ(TALog::TALogger::configurationError(), "");
+        // Each file line says when (UTC, ms), how bad, and which process.
+        const std::regex head(R"(\d{4}-\d\d-\d\dT\d\d:\d\d:\d\d\.\d{3}Z (DEBUG|ERROR) (\d+) (entry|failure))");
+        auto raw = lines(files.rawLog());
+        ASSERT_EQ(raw.size(), 2u);
+        std::smatch m;
+        ASSERT_TRUE(std::regex_match(raw[0], m, head)) << raw[0];
+        EXPECT_EQ(m[1], "DEBUG");
+        EXPECT_EQ(m[2], std::to_string(::getpid()));
+        ASSERT_TRUE(std::regex_match(raw[1], m, head)) << raw[1];
+        EXPECT_EQ(m[1], "ERROR");
     }
+}
+
+// Loaded by an object manager, the library must leave the process's syslog identity alone.
+TEST(Logging, SyslogKeepsTheHostProcessIdentity) {
+    int fds[2];
+    ASSERT_EQ(::pipe(fds), 0);
+    pid_t pid = ::fork();
+    ASSERT_GE(pid, 0);
+    if (pid == 0) {
+        // A private /dev holding our own /dev/log, in a mount namespace of this child only.
+        ::close(fds[0]);
+        auto fail = [&](const char* why) {
+            (void)!::write(fds[1], why, std::strlen(why));
+            ::_exit(2);
+        };
+        if (::unshare(CLONE_NEWNS) != 0 || ::mount(nullptr, "/", nullptr, MS_REC | MS_PRIVATE, nullptr) != 0 ||
+            ::mount("tmpfs", "/dev", "tmpfs", 0, nullptr) != 0)
+            fail("SKIP");
+        int sink = ::socket(AF_UNIX, SOCK_DGRAM, 0);
+        sockaddr_un addr{};
+        addr.sun_family = AF_UNIX;
+        std::strcpy(addr.sun_path, "/dev/log");
+        if (sink < 0 || ::bind(sink, reinterpret_cast<sockaddr*>(&addr), sizeof addr) != 0) fail("bind");
+        ::unsetenv("IPIF_LOG_FILE");
+        ::setenv("IPIF_LOG_LEVEL", "6000", 1);
+        TALog::TALogger::reconfigure();
+        ::openlog("cimserver", LOG_NDELAY, LOG_DAEMON);
+        ::syslog(LOG_INFO, "host before");
+        Nx::logRecord(kComponent, "f", "F.cpp", 1, 6000, "provider record");
+        ::syslog(LOG_INFO, "host after");
+        std::string got;
+        char buffer[512];
+        for (int i = 0; i < 3; ++i) {
+            ssize_t n = ::recv(sink, buffer, sizeof buffer, MSG_DONTWAIT);
+            if (n > 0) got.append(buffer, static_cast<size_t>(n)) += '\n';
+        }
+        (void)!::write(fds[1], got.data(), got.size());
+        ::_exit(0);
+    }
+    ::close(fds[1]);
+    std::string got;
+    char buffer[512];
+    for (ssize_t n; (n = ::read(fds[0], buffer, sizeof buffer)) > 0;) got.append(buffer, static_cast<size_t>(n));
+    ::close(fds[0]);
+    int status = 0;
+    ASSERT_EQ(::waitpid(pid, &status, 0), pid);
+    if (got == "SKIP") GTEST_SKIP() << "no mount namespace here";
+    ASSERT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0) << got;
+    auto received = lines(got);
+    ASSERT_EQ(received.size(), 3u) << got;
+    for (const std::string& line : received) EXPECT_NE(line.find("cimserver: "), std::string::npos) << line;
+    EXPECT_NE(received[1].find("cimserver: IPInterfaceProvider: provider record"), std::string::npos) << received[1];
 }
 
 TEST(Logging, AppendsFromThreadsAndProcessesNeverInterleave) {

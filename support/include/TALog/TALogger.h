@@ -1,9 +1,13 @@
 // The logging library: records routed by level to a file or the system log.
 //
 // Environment:
-//   IPIF_LOG_LEVEL  threshold; records below it are dropped (default 6000: failures only)
-//   IPIF_LOG_FILE   append log records to this file, one line per record, text as given;
-//                   without it log records go to syslog (facility daemon, ident "ipif")
+//   IPIF_LOG_LEVEL  threshold, a whole number from 0 to 1000000; records below it are dropped
+//                   (default 6000: failures only). Anything else is reported as an error record
+//                   and the default holds; configurationError() tells callers that can refuse.
+//   IPIF_LOG_FILE   append log records to this file, one line per record:
+//                   "<UTC time, ms> <ERROR|WARNING|INFO|DEBUG> <pid> <text>";
+//                   without it log records go to syslog (facility daemon, the process's own
+//                   ident, text prefixed "IPInterfaceProvider: ")
 //   IPIF_TRACE_FILE append trace records (the second copy of every record) to this file, one
 //                   line each: "<pid> <tid> <level> <component> <function> <file>:<line>: <text>";
 //                   without it trace records are dropped
@@ -27,6 +31,9 @@ public:
 
     // Re-reads the environment (tests change it between cases).
     static void reconfigure();
+
+    // Why the environment could not be used as given; empty when it could.
+    static std::string configurationError();
 };
 
 }  // namespace TALog
