@@ -32,6 +32,14 @@ namespace IPInterfaceProvider {
 const std::string loggerIPInterfaceProvider = "Tarvo.IPInterfaceProvider";
 
 const CMPIBroker* broker = nullptr;
+
+// An object manager may call a factory again (another interface, a reload) while requests run on
+// other threads: every access to broker is atomic, and a factory handing over the broker that is
+// already set writes nothing.
+static const CMPIBroker* currentBroker() { return __atomic_load_n(&broker, __ATOMIC_ACQUIRE); }
+static void storeBroker(const CMPIBroker* given) {
+    if (currentBroker() != given) __atomic_store_n(&broker, given, __ATOMIC_RELEASE);
+}
 const char* slpClassName = "PG_WBEMSLPTemplate";
 const char* slpMethodName = "update";
 const char* slpNameSpace = "root/PG_Internal";
@@ -64,7 +72,7 @@ const char* orEmpty(const char* text) { return text ? text : ""; }
 // Builds an adapter over cop for the request and hands it to use; it is destroyed on every path.
 template <class Adapter, class Use>
 bool serveWith(const CMPIContext* ctx, const CMPIObjectPath* cop, Use& use) {
-    Adapter adapter(broker, ctx, cop);
+    Adapter adapter(currentBroker(), ctx, cop);
     use(adapter);
     return true;
 }
@@ -232,7 +240,7 @@ bool getClassId(const char* className, const char* nameSpace, std::vector<unsign
     bool appended = false;
     const std::string ns = orEmpty(nameSpace);
     for (const Parent& parent : parents) {
-        if (!ProviderUtilities::areClassesRelated(broker, ns, className, parent.name)) continue;
+        if (!ProviderUtilities::areClassesRelated(currentBroker(), ns, className, parent.name)) continue;
         if (parent.ids.front() == IPHostedAccessPointId) {
             NX_VAR(loggerIPInterfaceProvider, "0x48", 72u);
             NX_VAR(loggerIPInterfaceProvider, "0x78", 120u);
@@ -302,7 +310,7 @@ CMPIStatus IPInterface_ModifyInstance(CMPIInstanceMI*, const CMPIContext* ctx, c
         unsigned short classId = ProviderUtilities::getClassId(cop);
         NX_VAR(loggerIPInterfaceProvider, "classId", static_cast<unsigned>(classId));
         bool served = withModifiableAdapter(classId, ctx, cop, [&](auto& adapter) {
-            NX_VAR(loggerIPInterfaceProvider, "objectPath", ProviderUtilities::toString(broker, cop).c_str());
+            NX_VAR(loggerIPInterfaceProvider, "objectPath", ProviderUtilities::toString(currentBroker(), cop).c_str());
             if (adapter) status = adapter.modifyInstance(ci);
             CMReturnDone(rslt);
         });
@@ -378,7 +386,7 @@ CMPIStatus IPInterface_InvokeMethod(CMPIMethodMI*, const CMPIContext* ctx, const
     try {
         unsigned short classId = ProviderUtilities::getClassId(cop);
         if (classId == IPProtocolEndpointId) {
-            CMPIProtocolEndpoint endpoint(broker, ctx, cop);
+            CMPIProtocolEndpoint endpoint(currentBroker(), ctx, cop);
             if (endpoint) {
                 if (method && std::strcmp(method, "RequestStateChange") == 0) {
                     ret = endpoint.executeMethod(in, out, &status);
@@ -390,7 +398,7 @@ CMPIStatus IPInterface_InvokeMethod(CMPIMethodMI*, const CMPIContext* ctx, const
             }
         } else if (classId == IPConfigurationServiceId) {
             // The one service needs no lookup: the method is run whatever the path names.
-            CMPIIPConfigurationService service(broker, ctx, cop);
+            CMPIIPConfigurationService service(currentBroker(), ctx, cop);
             if (method && std::strcmp(method, "ApplySettingToIPProtocolEndpoint") == 0) {
                 ret = service.executeMethod(in, out, &status);
                 NX_VAR(loggerIPInterfaceProvider, "ret", static_cast<unsigned>(ret));
@@ -404,7 +412,7 @@ CMPIStatus IPInterface_InvokeMethod(CMPIMethodMI*, const CMPIContext* ctx, const
         }
     } catch (const std::exception& e) {
         status.rc = CMPI_RC_ERR_FAILED;
-        status.msg = broker ? CMNewString(broker, e.what(), nullptr) : nullptr;
+        if (const CMPIBroker* b = currentBroker()) status.msg = CMNewString(b, e.what(), nullptr);
     }
     CMReturnData(rslt, &ret, CMPI_uint32);
     CMReturnDone(rslt);
@@ -421,19 +429,19 @@ extern "C" {
 
 CMPIInstanceMI* IPInterfaceProvider_Create_InstanceMI(const CMPIBroker* brkr, const CMPIContext*, CMPIStatus*) {
     static CMPIInstanceMI mi = {nullptr, &instMIFT__};
-    broker = brkr;
+    storeBroker(brkr);
     return &mi;
 }
 
 CMPIAssociationMI* IPInterfaceProvider_Create_AssociationMI(const CMPIBroker* brkr, const CMPIContext*, CMPIStatus*) {
     static CMPIAssociationMI mi = {nullptr, &assocMIFT__};
-    broker = brkr;
+    storeBroker(brkr);
     return &mi;
 }
 
 CMPIMethodMI* IPInterfaceProvider_Create_MethodMI(const CMPIBroker* brkr, const CMPIContext*, CMPIStatus*) {
     static CMPIMethodMI mi = {nullptr, &methMIFT__};
-    broker = brkr;
+    storeBroker(brkr);
     return &mi;
 }
 

@@ -12,7 +12,9 @@
 #include <set>
 #include <sstream>
 #include <string>
+#include <thread>
 #include <vector>
+#include <atomic>
 
 #include "TestFiles.h"
 #include "ipif/Host.h"
@@ -143,6 +145,34 @@ TEST(ProviderLibrary, FactoriesKeepTheLastBrokerAndReturnFixedRecords) {
     EXPECT_EQ(i->ft->cleanup(i, nullptr, 1).rc, CMPI_RC_OK);
     EXPECT_EQ(s->ft->cleanup(s, nullptr, 0).rc, CMPI_RC_OK);
     EXPECT_EQ(m->ft->cleanup(m, nullptr, 1).rc, CMPI_RC_OK);
+    dlclose(lib);
+}
+
+// Factories called again while requests run (an object manager loading another interface of the
+// library) must not race with the requests' reads of the broker; the ThreadSanitizer build checks.
+TEST_F(ProviderRequests, FactoriesRunningBesideRequestsDoNotRace) {
+    const size_t endpoints = host().enumerateInstanceNames("root/cimv2", "KVRNX_IPProtocolEndpoint").paths.size();
+    ASSERT_GT(endpoints, 0u);
+    void* lib = dlopen(kLibrary.c_str(), RTLD_NOW | RTLD_NOLOAD);
+    ASSERT_NE(lib, nullptr) << "the host loads the provider from " << kLibrary;
+    using InstFactory = CMPIInstanceMI* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+    auto inst = reinterpret_cast<InstFactory>(dlsym(lib, "IPInterfaceProvider_Create_InstanceMI"));
+    auto brokerGlobal = static_cast<const CMPIBroker**>(dlsym(lib, "_ZN2Nx19IPInterfaceProvider6brokerE"));
+    ASSERT_TRUE(inst && brokerGlobal);
+    const CMPIBroker* given = __atomic_load_n(brokerGlobal, __ATOMIC_ACQUIRE);
+    ASSERT_NE(given, nullptr);
+
+    std::atomic<int> served{0};
+    std::vector<std::thread> requests;
+    for (int t = 0; t < 2; ++t)
+        requests.emplace_back([&] {
+            for (int i = 0; i < 20; ++i)
+                if (host().enumerateInstanceNames("root/cimv2", "KVRNX_IPProtocolEndpoint").paths.size() == endpoints) ++served;
+        });
+    for (int i = 0; i < 200; ++i) inst(given, nullptr, nullptr);
+    for (auto& t : requests) t.join();
+    EXPECT_EQ(served.load(), 40);
+    EXPECT_EQ(__atomic_load_n(brokerGlobal, __ATOMIC_ACQUIRE), given);
     dlclose(lib);
 }
 
