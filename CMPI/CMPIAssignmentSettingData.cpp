@@ -1,4 +1,5 @@
 #include "CMPI/CMPIAssignmentSettingData.h"
+#include "Lindows/ConfigurationFile.h"
 
 namespace Nx {
 namespace IPInterfaceProvider {
@@ -45,7 +46,10 @@ CMPIStatus CMPIAssignmentSettingData::modifyInstance(const CMPIInstance* newInst
         // A modification that leaves ConfigurationName out clears it.
         std::string configurationName;
         ProviderUtilities::getProperty(newInstance, "ConfigurationName", configurationName);
-        model.setConfigurationName(configurationName);
+        if (isSafeConfigurationValue(configurationName))
+            model.setConfigurationName(configurationName);
+        else
+            status = refuseProperty("ConfigurationName");
     }
     NX_EXIT_PARAMS(loggerCMPIAssignmentSettingData, params.c_str());
     return status;

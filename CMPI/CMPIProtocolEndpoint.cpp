@@ -81,7 +81,7 @@ CMPIStatus CMPIProtocolEndpoint::modifyInstance(const CMPIInstance* newInstance)
     if (ProviderUtilities::getProperty(newInstance, "IPv4Address", address)) {
         NX_VAR(loggerCMPIProtocolEndpoint, "IPv4Address:", address.c_str());
         if (ProviderUtilities::ValidateInput(address, "") == 0) {
-            status.rc = CMPI_RC_ERR_INVALID_PARAMETER;
+            status = refuseProperty("IPv4Address");
         } else {
             model.setIPv4Address(address);
         }
@@ -90,7 +90,7 @@ CMPIStatus CMPIProtocolEndpoint::modifyInstance(const CMPIInstance* newInstance)
     if (status.rc == CMPI_RC_OK && ProviderUtilities::getProperty(newInstance, "SubnetMask", mask)) {
         NX_VAR(loggerCMPIProtocolEndpoint, "SubnetMask:", mask.c_str());
         if (ProviderUtilities::ValidateInput(mask, "") == 0) {
-            status.rc = CMPI_RC_ERR_INVALID_PARAMETER;
+            status = refuseProperty("SubnetMask");
         } else {
             model.setSubnetMask(mask);
         }

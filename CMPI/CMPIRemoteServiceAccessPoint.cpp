@@ -60,7 +60,7 @@ CMPIStatus CMPIRemoteServiceAccessPoint::modifyInstance(const CMPIInstance* newI
         // The address ends up in a file that network scripts source as root.
         if (ProviderUtilities::ValidateInput(accessInfo, ":") == 0) {
             NX_MESSAGE(loggerCMPIRemoteServiceAccessPoint, 6000, "Invalid Security data passed in the property value");
-            status.rc = CMPI_RC_ERR_INVALID_PARAMETER;
+            status = refuseProperty("AccessInfo");
         } else {
             // Which gateway is written follows the interface's protocol type, not the one
             // presented; a refused write is not reported back.

@@ -1,4 +1,5 @@
 #include "CMPI/CMPIStaticIPAssignmentSettingData.h"
+#include "Lindows/ConfigurationFile.h"
 
 namespace Nx {
 namespace IPInterfaceProvider {
@@ -67,7 +68,7 @@ CMPIStatus CMPIStaticIPAssignmentSettingData::modifyInstance(const CMPIInstance*
                 if (ipv6)
                     NX_MESSAGE(loggerCMPIStaticIPAssignmentSettingData, 6000,
                                "Invalid Security data passed in the property value");
-                status.rc = CMPI_RC_ERR_INVALID_PARAMETER;
+                status = refuseProperty(name);
                 return false;
             }
             std::invoke(setter, model, value);
@@ -83,7 +84,10 @@ CMPIStatus CMPIStaticIPAssignmentSettingData::modifyInstance(const CMPIInstance*
             // A modification that leaves ConfigurationName out clears it.
             std::string configurationName;
             ProviderUtilities::getProperty(newInstance, "ConfigurationName", configurationName);
-            model.setConfigurationName(configurationName);
+            if (isSafeConfigurationValue(configurationName))
+                model.setConfigurationName(configurationName);
+            else
+                status = refuseProperty("ConfigurationName");
         }
     }
     NX_EXIT_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());

@@ -216,6 +216,13 @@ protected:
         return status;
     }
 
+    // The answer to a modification carrying a value that may not be written into the host's
+    // configuration: the client learns which property it was.
+    CMPIStatus refuseProperty(const char* name) const {
+        const std::string text = std::string(name) + ": the value holds characters that may not be written to the host configuration";
+        return makeStatus(CMPI_RC_ERR_INVALID_PARAMETER, text.c_str());
+    }
+
     // A method argument; an absent argument (or no argument list) reads as untyped.
     static CMPIData argument(const CMPIArgs* in, const char* name) {
         CMPIData data = {};

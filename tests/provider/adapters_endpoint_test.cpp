@@ -102,12 +102,12 @@ TEST_F(EndpointAdapter, ModifyAppliesEachAcceptedValueAtOnceWithoutRollback) {
     CMPIInstance* change = instance(p, {{"IPv4Address", "192.168.1.77"}, {"SubnetMask", "255.255.0.0;reboot"}});
     CMPIUint16 origin = 4;
     CMSetProperty(change, "AddressOrigin", &origin, CMPI_uint16);
-    EXPECT_EQ(modify(change), "4:(null)");
+    EXPECT_EQ(modify(change).rfind("4:SubnetMask: ", 0), 0u);
     EXPECT_EQ(node("/host/eth0/ip", 24).number, 1u);  // DHCP is stored as code 1
     EXPECT_EQ(node("/host/eth0/ip", 25).text, "192.168.1.77");
     EXPECT_EQ(node("/host/eth0/ip", 26).text, "255.255.255.0");
     // A rejected address ends the modification before the mask is looked at.
-    EXPECT_EQ(modify(instance(p, {{"IPv4Address", "10.0.0.1 "}, {"SubnetMask", "255.0.0.0"}})), "4:(null)");
+    EXPECT_EQ(modify(instance(p, {{"IPv4Address", "10.0.0.1 "}, {"SubnetMask", "255.0.0.0"}})).rfind("4:IPv4Address: ", 0), 0u);
     EXPECT_EQ(node("/host/eth0/ip", 26).text, "255.255.255.0");
     EXPECT_EQ(modify(instance(p, {{"SubnetMask", "255.255.252.0"}})), "0:(null)");
     EXPECT_EQ(node("/host/eth0/ip", 26).text, "255.255.252.0");

@@ -13,6 +13,8 @@ using namespace adaptertest;
 
 namespace {
 
+const std::string kRefused = ": the value holds characters that may not be written to the host configuration";
+
 const char* const kStatic = "KVRNX_StaticIPAssignmentSettingData";
 const char* const kAssignment = "KVRNX_IPAssignmentSettingData";
 const char* const kSecurity = "Invalid Security data passed in the property value";
@@ -72,7 +74,7 @@ TEST_F(SettingDataAdapter, StaticModifyStopsAtTheFirstRejectionAndKeepsEarlierWr
                                   {"SubnetMask", "255.255.0.0"},
                                   {"GatewayIPv4Address", "192.168.1.1$(reboot)"},
                                   {"ConfigurationName", "never"}})),
-              "4:(null)");
+              "4:GatewayIPv4Address" + kRefused);
     EXPECT_EQ(testfiles::readFile(ifcfg("eth0")),
               "NETMASK=255.255.0.0\nGATEWAY=192.168.1.1\nCONFIG_NAME=lab\nIPv4ADDR=192.168.1.20\n");
     EXPECT_EQ(logged(kSecurity), 0u);  // IPv4-style rejections say nothing
@@ -80,10 +82,16 @@ TEST_F(SettingDataAdapter, StaticModifyStopsAtTheFirstRejectionAndKeepsEarlierWr
     EXPECT_EQ(modify(instance(p, {{"GatewayIPv4Address", "192.168.1.254"},
                                   {"IPv6Address", "2001:db8::5\nBOOTPROTO=dhcp"},
                                   {"GatewayIPv6Address", "2001:db8::1"}})),
-              "4:(null)");
+              "4:IPv6Address" + kRefused);
     EXPECT_EQ(logged(kSecurity), 1u);
     EXPECT_EQ(testfiles::readFile(ifcfg("eth0")),
               "NETMASK=255.255.0.0\nGATEWAY=192.168.1.254\nCONFIG_NAME=lab\nIPv4ADDR=192.168.1.20\n");
+
+    // The addresses pass, the name cannot be written: the client hears which property failed.
+    EXPECT_EQ(modify(instance(p, {{"IPv4Address", "192.168.1.21"}, {"ConfigurationName", "lab`reboot`"}})),
+              "4:ConfigurationName" + kRefused);
+    EXPECT_EQ(testfiles::readFile(ifcfg("eth0")),
+              "NETMASK=255.255.0.0\nGATEWAY=192.168.1.254\nCONFIG_NAME=lab\nIPv4ADDR=192.168.1.21\n");
 
     // Everything accepted; leaving ConfigurationName out clears it.
     CMPIInstance* change = instance(p, {{"IPv6Address", "2001:db8::5"}, {"GatewayIPv6Address", "2001:db8::1"}});
@@ -91,7 +99,7 @@ TEST_F(SettingDataAdapter, StaticModifyStopsAtTheFirstRejectionAndKeepsEarlierWr
     CMSetProperty(change, "IPv6SubnetPrefixLength", &prefix, CMPI_uint16);
     EXPECT_EQ(modify(change), "0:(null)");
     EXPECT_EQ(testfiles::readFile(ifcfg("eth0")),
-              "NETMASK=255.255.0.0\nGATEWAY=192.168.1.254\nCONFIG_NAME=\nIPv4ADDR=192.168.1.20\n"
+              "NETMASK=255.255.0.0\nGATEWAY=192.168.1.254\nCONFIG_NAME=\nIPv4ADDR=192.168.1.21\n"
               "IPV6ADDR=2001:db8::5\nIPV6GATEWAY=2001:db8::1\nPREFIX=48\n");
 }
 
@@ -115,9 +123,9 @@ TEST_F(SettingDataAdapter, AssignmentSettingsComeInPairsAndModifyOnlyTouchesTheC
     EXPECT_EQ(statusText(keyed.modifyInstance(instance(p, {{"ConfigurationName", "home"}, {"ElementName", "x"}}))),
               "0:(null)");
     EXPECT_EQ(testfiles::readFile(ifcfg("eth1")), "DEVICE=eth1\nCONFIG_NAME=home\n");
-    // The file layer is the only guard of this value: an unsafe one is refused there, and logged.
-    EXPECT_EQ(statusText(keyed.modifyInstance(instance(p, {{"ConfigurationName", "a;reboot"}}))), "0:(null)");
-    EXPECT_EQ(logged("Refused to write a configuration value"), 1u);
+    // An unsafe name is refused as such, and nothing is written.
+    EXPECT_EQ(statusText(keyed.modifyInstance(instance(p, {{"ConfigurationName", "a;reboot"}}))),
+              "4:ConfigurationName" + kRefused);
     EXPECT_EQ(testfiles::readFile(ifcfg("eth1")), "DEVICE=eth1\nCONFIG_NAME=home\n");
     EXPECT_EQ(statusText(keyed.modifyInstance(instance(p, {}))), "0:(null)");
     EXPECT_EQ(testfiles::readFile(ifcfg("eth1")), "DEVICE=eth1\nCONFIG_NAME=\n");
