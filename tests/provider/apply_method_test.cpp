@@ -51,8 +51,8 @@ protected:
     ipif::Host& host() {
         if (!host_) {
             ipif::HostOptions options;
-            options.mofPaths = {std::string(IPIF_SOURCE_DIR) + "/mof"};
-            options.regPaths = options.mofPaths;
+            options.mofPaths = testfiles::projectMofPaths();
+            options.regPaths = {std::string(IPIF_SOURCE_DIR) + "/mof"};
             options.providerDirs = {IPIF_BINARY_DIR};
             host_ = std::make_unique<ipif::Host>(options);
         }
