@@ -309,3 +309,65 @@ TEST(Registration, ReadsSfcbFilesAndRejectsMalformedOnes) {
     EXPECT_EQ(methods, 2);
 }
 
+// Each provider library's OpenPegasus registration says what its sfcb .reg file says: one CMPI
+// 2.0 module at the library's location, one provider, and per class the same namespaces and
+// provider types (2 instance, 3 association, 5 method).
+TEST(Registration, PegasusFilesMatchTheSfcbFiles) {
+    using Props = std::map<std::string, std::string>;
+    auto instances = [](const std::string& text) {
+        std::vector<std::pair<std::string, Props>> out;
+        std::regex head(R"(instance\s+of\s+(\w+)\s*\{)"), prop(R"((\w+)\s*=\s*(\{[^}]*\}|"[^"]*"|\w+)\s*;)");
+        for (std::sregex_iterator h(text.begin(), text.end(), head), end; h != end; ++h) {
+            out.emplace_back((*h)[1], Props());
+            auto next = std::next(h);
+            std::string body = text.substr(h->position() + h->length(),
+                                           (next == end ? text.size() : next->position()) - h->position() - h->length());
+            for (std::sregex_iterator p(body.begin(), body.end(), prop); p != end; ++p) {
+                std::string v = (*p)[2];
+                v.erase(std::remove_if(v.begin(), v.end(), [](char c) { return std::strchr("{}\" ", c); }), v.end());
+                out.back().second[(*p)[1]] = v;
+            }
+        }
+        return out;
+    };
+    for (std::string lib : {"IPInterfaceProvider", "IPInterfaceCompanion"}) {
+        auto regs = loadRegistrations(IPIF_SOURCE_DIR "/mof/" + lib + ".reg");
+        ASSERT_FALSE(regs.empty());
+        std::map<std::string, std::string> expected, got;  // class: namespaces|types
+        for (const auto& r : regs) {
+            EXPECT_EQ(r.location, lib);
+            std::string ns;
+            for (const auto& n : r.namespaces) ns += (ns.empty() ? "" : ",") + n;
+            expected[r.className] = ns + "|" + (r.instance ? "2," : "") + (r.association ? "3," : "") +
+                                    (r.method ? "5," : "");
+        }
+        std::string module;
+        std::set<std::string> ids;
+        int modules = 0, providers = 0;
+        for (auto& [cls, p] : instances(testfiles::readFile(IPIF_SOURCE_DIR "/mof/pegasus/" + lib + ".mof"))) {
+            if (cls == "PG_ProviderModule") {
+                ++modules;
+                module = p["Name"];
+                EXPECT_EQ(p["Location"], lib);
+                EXPECT_EQ(p["InterfaceType"], "CMPI");
+                EXPECT_EQ(p["InterfaceVersion"], "2.0.0");
+                EXPECT_EQ(p["Version"], IPIF_VERSION);
+                EXPECT_FALSE(p["Vendor"].empty());
+            } else if (cls == "PG_Provider") {
+                ++providers;
+                EXPECT_EQ(p["Name"], regs[0].providerName);
+                EXPECT_EQ(p["ProviderModuleName"], module);
+            } else {
+                EXPECT_EQ(cls, "PG_ProviderCapabilities");
+                EXPECT_EQ(p["ProviderModuleName"], module);
+                EXPECT_EQ(p["ProviderName"], regs[0].providerName);
+                EXPECT_TRUE(ids.insert(p["CapabilityID"]).second) << p["CapabilityID"];
+                got[p["ClassName"]] = p["Namespaces"] + "|" + p["ProviderType"] + ",";
+            }
+        }
+        EXPECT_EQ(modules, 1) << lib;
+        EXPECT_EQ(providers, 1) << lib;
+        EXPECT_FALSE(module.empty());
+        EXPECT_EQ(got, expected) << lib;
+    }
+}
