@@ -8,14 +8,8 @@
 #include <cstdlib>
 #include <thread>
 
+#include "DefaultPaths.h"
 #include "Internal.h"
-
-#ifndef IPIF_DEFAULT_MOF_DIR
-#define IPIF_DEFAULT_MOF_DIR "mof"
-#endif
-#ifndef IPIF_DEFAULT_PROVIDER_DIR
-#define IPIF_DEFAULT_PROVIDER_DIR "."
-#endif
 
 namespace ipif {
 
@@ -110,7 +104,7 @@ Host::Impl::Impl(HostOptions o) : options(std::move(o)) {
     std::vector<std::string> mofs = options.mofPaths;
     if (mofs.empty()) {
         const char* env = std::getenv("IPIF_MOF_DIR");
-        mofs.push_back(env && *env ? env : IPIF_DEFAULT_MOF_DIR);
+        mofs = env && *env ? HostOptions::splitList(env) : defaultMofPaths();
     }
     for (const auto& m : mofs) repo.addPath(m);
     repo.resolve();
@@ -118,7 +112,7 @@ Host::Impl::Impl(HostOptions o) : options(std::move(o)) {
     std::vector<std::string> regPaths = options.regPaths;
     if (regPaths.empty()) {
         const char* env = std::getenv("IPIF_REG");
-        regPaths = env && *env ? HostOptions::splitList(env) : std::vector<std::string>{IPIF_DEFAULT_MOF_DIR};
+        regPaths = env && *env ? HostOptions::splitList(env) : std::vector<std::string>{defaultDataDir()};
     }
     for (const auto& p : regPaths) {
         auto more = loadRegistrations(p);
@@ -256,7 +250,7 @@ void* Host::Impl::miFor(Provider& p, Kind kind, std::string& error) {
             auto more = HostOptions::splitList(env);
             dirs.insert(dirs.end(), more.begin(), more.end());
         }
-        dirs.push_back(IPIF_DEFAULT_PROVIDER_DIR);
+        dirs.push_back(defaultProviderDir());
         for (const auto& d : dirs) {
             std::string path = d + "/" + file;
             if (access(path.c_str(), F_OK) != 0) continue;

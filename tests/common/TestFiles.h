@@ -96,4 +96,10 @@ inline std::string readLogTexts(const std::string& path) {
     return texts;
 }
 
+// What the embedded host loads for the project: the stand-ins for the DMTF parents, then the
+// classes an object manager is given.
+inline std::vector<std::string> projectMofPaths() {
+    return {IPIF_SOURCE_DIR "/mof/embedded", IPIF_SOURCE_DIR "/mof"};
+}
+
 }  // namespace testfiles

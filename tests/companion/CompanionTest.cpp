@@ -87,7 +87,7 @@ protected:
     ipif::Host& host() {
         if (!host_) {
             ipif::HostOptions options;
-            options.mofPaths = {IPIF_SOURCE_DIR "/mof"};
+            options.mofPaths = testfiles::projectMofPaths();
             options.regPaths = {IPIF_SOURCE_DIR "/mof/IPInterfaceProvider.reg",
                                 IPIF_SOURCE_DIR "/mof/IPInterfaceCompanion.reg"};
             options.providerDirs = {IPIF_BINARY_DIR};

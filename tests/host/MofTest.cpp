@@ -2,9 +2,17 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <cctype>
+#include <cstring>
+#include <filesystem>
+#include <iterator>
+#include <map>
+#include <regex>
 #include <set>
+#include <sstream>
 
 #include "HostTestSupport.h"
+#include "TestFiles.h"
 #include "ipif/Mof.h"
 #include "ipif/Registration.h"
 
@@ -130,7 +138,7 @@ TEST(Mof, RepositoryResolvesInheritanceAndRejectsDanglingNames) {
 
 TEST(Mof, ProjectClassesCarryTheProviderSchema) {
     ClassRepository repo;
-    repo.addPath(IPIF_SOURCE_DIR "/mof");
+    for (const auto& p : testfiles::projectMofPaths()) repo.addPath(p);
     repo.resolve();
 
     const std::vector<std::pair<const char*, CimType>> endpoint = {
@@ -155,12 +163,12 @@ TEST(Mof, ProjectClassesCarryTheProviderSchema) {
     ASSERT_NE(rsc, nullptr);
     ASSERT_EQ(rsc->parameters.size(), 3u);
     EXPECT_EQ(rsc->parameters[0].type, CimType::Uint16);
-    EXPECT_TRUE(rsc->parameters[1].in && rsc->parameters[1].out);
+    EXPECT_TRUE(!rsc->parameters[1].in && rsc->parameters[1].out);
     EXPECT_EQ(rsc->parameters[1].refClass, "CIM_ConcreteJob");
     EXPECT_EQ(rsc->parameters[2].type, CimType::DateTime);
     const MethodDecl* apply = repo.method("KVRNX_IPConfigurationService", "ApplySettingToIPProtocolEndpoint");
     ASSERT_NE(apply, nullptr);
-    EXPECT_EQ(apply->parameters[0].refClass, "CIM_SettingData");
+    EXPECT_EQ(apply->parameters[0].refClass, "CIM_IPAssignmentSettingData");
     EXPECT_EQ(apply->parameters[1].refClass, "CIM_IPProtocolEndpoint");
     EXPECT_EQ(repo.keyNames("KVRNX_ConcreteJob"), std::vector<std::string>{"InstanceID"});
     EXPECT_EQ(repo.property("KVRNX_IPEnabledLogicalElementCapabilities", "RequestedStatesSupported")->array, true);
@@ -213,6 +221,44 @@ TEST(Mof, ProjectClassesCarryTheProviderSchema) {
     EXPECT_TRUE(repo.isA("KVRNX_DNSSAPSAPDependency", "CIM_SAPSAPDependency"));
 }
 
+// An object manager is given every mof/*.mof on top of its own DMTF schema: those files must
+// declare no CIM_ class or qualifier of their own, and may derive from or refer to only their
+// own classes and the CIM_ classes the embedded host stands in for.
+TEST(Mof, ObjectManagerFilesLeaveTheSchemaAlone) {
+    auto lower = [](std::string s) {
+        for (auto& c : s) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+        return s;
+    };
+    auto classesIn = [&](const std::string& dir, std::vector<ClassDecl>& out) {
+        std::set<std::string> names;
+        for (const auto& e : std::filesystem::directory_iterator(dir)) {
+            if (lower(e.path().extension().string()) != ".mof") continue;
+            std::string text = testfiles::readFile(e.path().string());
+            std::istringstream lines(text);
+            for (std::string word; lines >> word;) EXPECT_NE(lower(word), "qualifier") << e.path();
+            for (auto& c : parseMof(text, e.path().string())) {
+                names.insert(lower(c.name));
+                out.push_back(std::move(c));
+            }
+        }
+        return names;
+    };
+    std::vector<ClassDecl> staged, standIns;
+    std::set<std::string> own = classesIn(IPIF_SOURCE_DIR "/mof", staged);
+    std::set<std::string> parents = classesIn(IPIF_SOURCE_DIR "/mof/embedded", standIns);
+    ASSERT_FALSE(staged.empty());
+    for (const auto& c : standIns) EXPECT_EQ(lower(c.name).rfind("cim_", 0), 0u) << c.name;
+    auto known = [&](const std::string& cls) { return own.count(lower(cls)) + parents.count(lower(cls)) > 0; };
+    for (const auto& c : staged) {
+        EXPECT_NE(lower(c.name).rfind("cim_", 0), 0u) << c.name << " in " << c.file;
+        EXPECT_FALSE(c.superclass.empty()) << c.name;
+        EXPECT_TRUE(known(c.superclass)) << c.name << " : " << c.superclass;
+        for (const auto& p : c.properties) EXPECT_TRUE(p.refClass.empty() || known(p.refClass)) << c.name << "." << p.name;
+        for (const auto& m : c.methods)
+            for (const auto& p : m.parameters) EXPECT_TRUE(p.refClass.empty() || known(p.refClass)) << c.name << "." << m.name;
+    }
+}
+
 TEST(Registration, ReadsSfcbFilesAndRejectsMalformedOnes) {
     auto regs = parseRegistrations(
         "# c\n[A_B]\n provider: Prov\n location: Lib\n type: instance  association\n namespace: root/a root/b\n"
@@ -241,7 +287,7 @@ TEST(Registration, ReadsSfcbFilesAndRejectsMalformedOnes) {
     EXPECT_EQ(failure("[A]\nprovider: P\nlocation: ../L\ntype: method\n"), "x.reg:3: bad location '../L'");
 
     ClassRepository repo;
-    repo.addPath(IPIF_SOURCE_DIR "/mof");
+    for (const auto& p : testfiles::projectMofPaths()) repo.addPath(p);
     repo.resolve();
     auto project = loadRegistrations(IPIF_SOURCE_DIR "/mof/IPInterfaceProvider.reg");
     ASSERT_EQ(project.size(), 17u);
@@ -261,4 +307,67 @@ TEST(Registration, ReadsSfcbFilesAndRejectsMalformedOnes) {
     EXPECT_EQ(names.size(), 17u);
     EXPECT_EQ(associations, 11);
     EXPECT_EQ(methods, 2);
+}
+
+// Each provider library's OpenPegasus registration says what its sfcb .reg file says: one CMPI
+// 2.0 module at the library's location, one provider, and per class the same namespaces and
+// provider types (2 instance, 3 association, 5 method).
+TEST(Registration, PegasusFilesMatchTheSfcbFiles) {
+    using Props = std::map<std::string, std::string>;
+    auto instances = [](const std::string& text) {
+        std::vector<std::pair<std::string, Props>> out;
+        std::regex head(R"(instance\s+of\s+(\w+)\s*\{)"), prop(R"((\w+)\s*=\s*(\{[^}]*\}|"[^"]*"|\w+)\s*;)");
+        for (std::sregex_iterator h(text.begin(), text.end(), head), end; h != end; ++h) {
+            out.emplace_back((*h)[1], Props());
+            auto next = std::next(h);
+            std::string body = text.substr(h->position() + h->length(),
+                                           (next == end ? text.size() : next->position()) - h->position() - h->length());
+            for (std::sregex_iterator p(body.begin(), body.end(), prop); p != end; ++p) {
+                std::string v = (*p)[2];
+                v.erase(std::remove_if(v.begin(), v.end(), [](char c) { return std::strchr("{}\" ", c); }), v.end());
+                out.back().second[(*p)[1]] = v;
+            }
+        }
+        return out;
+    };
+    for (std::string lib : {"IPInterfaceProvider", "IPInterfaceCompanion"}) {
+        auto regs = loadRegistrations(IPIF_SOURCE_DIR "/mof/" + lib + ".reg");
+        ASSERT_FALSE(regs.empty());
+        std::map<std::string, std::string> expected, got;  // class: namespaces|types
+        for (const auto& r : regs) {
+            EXPECT_EQ(r.location, lib);
+            std::string ns;
+            for (const auto& n : r.namespaces) ns += (ns.empty() ? "" : ",") + n;
+            expected[r.className] = ns + "|" + (r.instance ? "2," : "") + (r.association ? "3," : "") +
+                                    (r.method ? "5," : "");
+        }
+        std::string module;
+        std::set<std::string> ids;
+        int modules = 0, providers = 0;
+        for (auto& [cls, p] : instances(testfiles::readFile(IPIF_SOURCE_DIR "/mof/pegasus/" + lib + ".mof"))) {
+            if (cls == "PG_ProviderModule") {
+                ++modules;
+                module = p["Name"];
+                EXPECT_EQ(p["Location"], lib);
+                EXPECT_EQ(p["InterfaceType"], "CMPI");
+                EXPECT_EQ(p["InterfaceVersion"], "2.0.0");
+                EXPECT_EQ(p["Version"], IPIF_VERSION);
+                EXPECT_FALSE(p["Vendor"].empty());
+            } else if (cls == "PG_Provider") {
+                ++providers;
+                EXPECT_EQ(p["Name"], regs[0].providerName);
+                EXPECT_EQ(p["ProviderModuleName"], module);
+            } else {
+                EXPECT_EQ(cls, "PG_ProviderCapabilities");
+                EXPECT_EQ(p["ProviderModuleName"], module);
+                EXPECT_EQ(p["ProviderName"], regs[0].providerName);
+                EXPECT_TRUE(ids.insert(p["CapabilityID"]).second) << p["CapabilityID"];
+                got[p["ClassName"]] = p["Namespaces"] + "|" + p["ProviderType"] + ",";
+            }
+        }
+        EXPECT_EQ(modules, 1) << lib;
+        EXPECT_EQ(providers, 1) << lib;
+        EXPECT_FALSE(module.empty());
+        EXPECT_EQ(got, expected) << lib;
+    }
 }

@@ -12,6 +12,7 @@
 #include <vector>
 
 #include "LiveNamespace.h"
+#include "TestFiles.h"
 #include "ipif/Host.h"
 
 namespace {
@@ -107,7 +108,7 @@ protected:
     ipif::Host& host() {
         if (!host_) {
             ipif::HostOptions options;
-            options.mofPaths = {IPIF_SOURCE_DIR "/mof"};
+            options.mofPaths = testfiles::projectMofPaths();
             options.regPaths = {IPIF_SOURCE_DIR "/mof"};
             options.providerDirs = {IPIF_BINARY_DIR};
             host_ = std::make_unique<ipif::Host>(options);

@@ -52,8 +52,8 @@ protected:
     ipif::Host& host() {
         if (!host_) {
             ipif::HostOptions options;
-            options.mofPaths = {std::string(IPIF_SOURCE_DIR) + "/mof"};
-            options.regPaths = options.mofPaths;
+            options.mofPaths = testfiles::projectMofPaths();
+            options.regPaths = {std::string(IPIF_SOURCE_DIR) + "/mof"};
             options.providerDirs = {IPIF_BINARY_DIR};
             // A sanitizer runtime starts its own lasting thread at the first thread the process
             // creates; have that happen before the Host counts the threads it does not own.

@@ -44,7 +44,7 @@ protected:
     ipif::Host& host(bool companion = true) {
         if (!host_) {
             ipif::HostOptions options;
-            options.mofPaths = {kSource + "/mof"};
+            options.mofPaths = testfiles::projectMofPaths();
             options.regPaths = {kSource + "/mof/IPInterfaceProvider.reg"};
             if (companion) options.regPaths.push_back(kSource + "/mof/IPInterfaceCompanion.reg");
             options.providerDirs = {IPIF_BINARY_DIR};

@@ -75,7 +75,8 @@ protected:
     ipif::Host& host() {
         if (!host_) {
             ipif::HostOptions options;
-            options.mofPaths = {std::string(IPIF_SOURCE_DIR) + "/mof", (dir_ / "extra.mof").string()};
+            options.mofPaths = testfiles::projectMofPaths();
+            options.mofPaths.push_back((dir_ / "extra.mof").string());
             options.regPaths = {std::string(IPIF_SOURCE_DIR) + "/mof/IPInterfaceProvider.reg",
                                 (dir_ / "extra.reg").string()};
             options.providerDirs = {IPIF_BINARY_DIR};

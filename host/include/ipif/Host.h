@@ -11,7 +11,8 @@
 // Mof.h and Registration.h). A provider library "lib<location>.so" is loaded with dlopen
 // (RTLD_NOW | RTLD_LOCAL) on the first request that needs it, from the first of:
 //   HostOptions::providerDirs, the directories of IPIF_PROVIDER_PATH (colon-separated), the
-//   build tree's directory of libIPInterfaceProvider.so, then the plain dlopen search.
+//   provider directory beside the program (../lib/cmpi from bin/ when installed; the build tree
+//   mirrors it), then the plain dlopen search.
 // Each MI factory (_Generic_Create_<T>MI if the library has it, else <provider>_Create_<T>MI)
 // is called once per provider per Host, with this Host's broker. The MI cleanups are called
 // when the Host is destroyed.
@@ -69,13 +70,15 @@ struct _CMPIBroker;
 namespace ipif {
 
 struct HostOptions {
-    // MOF files or directories (every *.mof). Empty: IPIF_MOF_DIR if set, else the source
-    // tree's mof/ directory.
+    // MOF files or directories (every *.mof). Empty: IPIF_MOF_DIR (colon-separated) if set,
+    // else the data directory's embedded/ (the DMTF parents) and the data directory itself.
+    // The data directory is IPIF_SHARE_DIR, else the one beside the program (../share/ipif
+    // from bin/ when installed; the build tree mirrors it onto the source tree's mof/).
     std::vector<std::string> mofPaths;
     // .reg files or directories (every *.reg). Empty: IPIF_REG (colon-separated) if set, else
-    // every *.reg of the source tree's mof/ directory.
+    // every *.reg of the data directory.
     std::vector<std::string> regPaths;
-    // Searched before IPIF_PROVIDER_PATH and the build tree.
+    // Searched before IPIF_PROVIDER_PATH and the directory beside the program.
     std::vector<std::string> providerDirs;
     std::string defaultNamespace = "root/cimv2";
     // Provider setProperty calls naming a property the class does not declare fail with
