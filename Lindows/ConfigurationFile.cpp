@@ -57,12 +57,8 @@ bool isSafeConfigurationKey(const std::string& key) {
     return true;
 }
 
-bool isSafeConfigurationValue(const std::string& value) {
-    static const std::string punctuation = ".:-_/%,@+";
-    for (char c : value)
-        if (!isAsciiAlnum(c) && punctuation.find(c) == std::string::npos) return false;
-    return true;
-}
+// Values are written bare, so only plain ones (Nx/PropertyFile.h) are taken.
+bool isSafeConfigurationValue(const std::string& value) { return Nx::isPlainValue(value); }
 
 bool updateConfigurationValue(const std::string& fileName, const std::string& key, const std::string& value) {
     TALog::TAMessageBuffer parameters;
@@ -105,7 +101,7 @@ bool configurationFilePath(const std::string& elementName, std::string& path) {
 }
 
 bool readConfigurationValue(const std::string& path, const std::string& key, std::string& value) {
-    if (!Nx::File::exists(Nx::make_wstring(path))) return false;
+    if (!Nx::File::exists(path)) return false;
     Nx::PropertyFile file{Nx::File::Path(path)};
     file.open(1);
     value = Nx::make_string(file.getValue(Nx::make_wstring(key)));

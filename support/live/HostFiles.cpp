@@ -1,7 +1,6 @@
 #include "HostFiles.h"
 
 #include <cerrno>
-#include <cstring>
 #include <dirent.h>
 #include <sstream>
 #include <sys/inotify.h>
@@ -9,6 +8,7 @@
 #include <unistd.h>
 
 #include "Nx/File.h"
+#include "Nx/PropertyFile.h"
 
 namespace Nx {
 namespace Live {
@@ -60,14 +60,6 @@ bool isOwnedResolverLine(const std::string& line) {
 
 }  // namespace
 
-bool isSafeValue(const std::string& value) {
-    for (const char c : value) {
-        const bool alnum = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9');
-        if (!alnum && !std::strchr(".:-_/%,@+", c)) return false;
-    }
-    return true;
-}
-
 std::map<std::string, std::string> parseAssignments(const std::string& content) {
     std::map<std::string, std::string> values;
     for (const std::string& line : splitLines(content)) {
@@ -76,10 +68,7 @@ std::map<std::string, std::string> parseAssignments(const std::string& content) 
         std::string value = line.substr(line.find('=') + 1);
         const std::size_t end = value.find_last_not_of(kBlanks);
         value.erase(end == std::string::npos ? 0 : end + 1);
-        if (value.size() >= 2 && (value.front() == '"' || value.front() == '\'') && value.back() == value.front()) {
-            value = value.substr(1, value.size() - 2);
-        }
-        values[key] = value;
+        values[key] = unquoteValue(value);
     }
     return values;
 }
@@ -139,18 +128,15 @@ std::string rewriteResolver(const std::string& content, const ResolverConfig& co
     return joinLines(lines);
 }
 
-std::map<std::string, std::string> readBootProtocols(const std::string& directory) {
-    std::map<std::string, std::string> result;
+std::map<std::string, std::map<std::string, std::string>> readInterfaceFiles(const std::string& directory) {
+    std::map<std::string, std::map<std::string, std::string>> result;
     DIR* dir = ::opendir(directory.c_str());
     if (!dir) return result;
     while (const dirent* entry = ::readdir(dir)) {
         const std::string name = entry->d_name;
         if (name.compare(0, 6, "ifcfg-") != 0 || name.size() == 6) continue;
         std::string content;
-        if (!File::read(directory + "/" + name, content)) continue;
-        const std::map<std::string, std::string> values = parseAssignments(content);
-        const auto found = values.find("BOOTPROTO");
-        if (found != values.end()) result[name.substr(6)] = found->second;
+        if (File::read(directory + "/" + name, content)) result[name.substr(6)] = parseAssignments(content);
     }
     ::closedir(dir);
     return result;

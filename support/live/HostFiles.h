@@ -10,18 +10,14 @@
 namespace Nx {
 namespace Live {
 
-// True when every character is a letter, a digit or one of ". : - _ / % , @ +" (empty is fine).
-// Such a value can be written unquoted into a file that start-up scripts source, and cannot break
-// out of a resolv.conf line.
-bool isSafeValue(const std::string& value);
-
-// KEY=value lines: the value of every key (the last assignment wins, as when sourced), one pair of
-// surrounding quotes removed; blank lines and comments skipped.
+// KEY=value lines: the value of every key (the last assignment wins, as when sourced), unquoted as
+// Nx::unquoteValue says (Nx/PropertyFile.h, where the quoting rule lives); blank lines and
+// comments skipped.
 std::map<std::string, std::string> parseAssignments(const std::string& content);
 
 // Sets KEY=value in the content: the first assignment of the key is replaced and later ones are
 // dropped; a key not yet assigned is appended. An empty value removes the key. Other lines are
-// kept as they were.
+// kept as they were. The value is written as it is: the caller quotes it (Nx::quoteValue).
 std::string assign(const std::string& content, const std::string& key, const std::string& value);
 
 struct ResolverConfig {
@@ -38,8 +34,9 @@ ResolverConfig parseResolver(const std::string& content);
 // and every other line are kept in order.
 std::string rewriteResolver(const std::string& content, const ResolverConfig& config);
 
-// The interfaces' BOOTPROTO values from every ifcfg-<interface> file in the directory, by interface.
-std::map<std::string, std::string> readBootProtocols(const std::string& directory);
+// The assignments of every ifcfg-<interface> file in the directory, by interface (the name's
+// bytes as they stand in the file name).
+std::map<std::string, std::map<std::string, std::string>> readInterfaceFiles(const std::string& directory);
 
 // Creates the directory and its missing parents (mode 0755). False when it cannot.
 bool makeDirectories(const std::string& path);

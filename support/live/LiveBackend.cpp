@@ -19,6 +19,7 @@
 #include "Nx/File.h"
 #include "Nx/NodeLexicon.h"
 #include "Nx/PlatformUtilities.h"
+#include "Nx/PropertyFile.h"
 
 namespace Nx {
 namespace HostModel {
@@ -125,9 +126,9 @@ public:
 
 private:
     static bool isSafe(const PropertyValue& value) {
-        if (!Live::isSafeValue(value.text)) return false;
+        if (!isPlainValue(value.text)) return false;
         for (const std::string& item : value.list) {
-            if (item.empty() || !Live::isSafeValue(item)) return false;
+            if (item.empty() || !isPlainValue(item)) return false;
         }
         return true;
     }
@@ -181,7 +182,7 @@ private:
         host.hostName = hostName;
         std::string resolver;
         if (File::read(now.resolver, resolver)) host.resolver = Live::parseResolver(resolver);
-        host.bootProtocols = Live::readBootProtocols(now.dataDirectory);
+        host.interfaceFiles = Live::readInterfaceFiles(now.dataDirectory);
         host.bmcInterfaces = bmcInterfaces(now.bmcSetting);
         tree_ = std::make_shared<const Tree>(Live::buildTree(kernel, host));
     }
@@ -227,11 +228,16 @@ private:
         }
     }
 
-    // The keys the network start-up scripts read, in the interface's ifcfg file.
+    // The keys the network start-up scripts read, in the interface's ifcfg file. The IPv6 address
+    // and its prefix go to IPV6ADDR and PREFIX, the keys the static setting data reads, and read
+    // back as written (LiveTree.cpp).
     bool writeInterfaceFile(const Node& node, unsigned int property, const PropertyValue& value) {
         const std::string name = text(node, P::ElementName);
+        std::string device;
+        if (!quoteValue(name, device)) return false;  // the file could not name its interface
         std::string key;
         std::string setting = value.text;
+        std::string slashPrefix;  // the "/n" of an address given with its prefix
         switch (property) {
         case P::AddressOrigin:
             if (value.number != 1 && value.number != 3) return false;
@@ -245,12 +251,16 @@ private:
         case P::IPv6Address: {
             key = "IPV6ADDR";
             const std::size_t slash = setting.find('/');
-            if (slash != std::string::npos && !isDecimal(setting.substr(slash + 1), 128)) return false;
+            if (slash != std::string::npos) {
+                slashPrefix = setting.substr(slash + 1);
+                if (!isDecimal(slashPrefix, 128)) return false;
+            }
             break;
         }
         case P::PrefixLength:
             if (value.number > 128) return false;
-            key = "IPV6ADDR";
+            key = "PREFIX";
+            setting = std::to_string(value.number);
             break;
         default:
             return false;
@@ -259,29 +269,28 @@ private:
         if (!Live::makeDirectories(withoutTrailingSlash(directory))) return false;
         bool applied = false;
         const bool written = File::update(directory + "ifcfg-" + name, [&](std::string& content, bool exists) {
-            if (!exists) content = "DEVICE=" + name + "\n";
-            std::string entry = setting;
-            if (key == "IPV6ADDR") {
-                // IPV6ADDR carries its prefix: keep whichever half of address/prefix is not written.
-                std::string address = Live::parseAssignments(content)["IPV6ADDR"];
-                std::string prefix;
-                const std::size_t slash = address.find('/');
-                if (slash != std::string::npos) {
-                    prefix = address.substr(slash + 1);
-                    address.erase(slash);
+            if (!exists) content = "DEVICE=" + device + "\n";
+            std::map<std::string, std::string> values = Live::parseAssignments(content);
+            // Without IPV6INIT=yes the start-up scripts ignore the address. An address keeps the
+            // file's prefix (or brings its own); a prefix needs an address to belong to.
+            if (property == P::IPv6Address && setting.empty()) {
+                content = Live::assign(content, "PREFIX", "");
+            } else if (property == P::IPv6Address) {
+                content = Live::assign(content, "IPV6INIT", "yes");
+                content = Live::assign(content, "IPV6ADDR", setting);
+                if (!slashPrefix.empty() || values["PREFIX"].empty()) {
+                    const PropertyValue* known = findProperty(node, P::PrefixLength);
+                    std::string prefix = slashPrefix;
+                    if (prefix.empty() && known && known->number > 0) prefix = std::to_string(known->number);
+                    content = Live::assign(content, "PREFIX", prefix.empty() ? std::string("64") : prefix);
                 }
-                if (property == P::PrefixLength) {
-                    if (address.empty()) address = text(node, P::IPv6Address);
-                    if (address.empty()) return false;  // a prefix needs an address to belong to
-                    entry = address + "/" + std::to_string(value.number);
-                } else if (!entry.empty() && entry.find('/') == std::string::npos) {
-                    const PropertyValue* live = findProperty(node, P::PrefixLength);
-                    if (prefix.empty() && live && live->number > 0) prefix = std::to_string(live->number);
-                    entry += "/" + (prefix.empty() ? std::string("64") : prefix);
-                }
-                if (!entry.empty()) content = Live::assign(content, "IPV6INIT", "yes");
+            } else if (property == P::PrefixLength && values["IPV6ADDR"].empty()) {
+                const std::string address = text(node, P::IPv6Address);  // the kernel's: the file has none
+                if (address.empty() || !isPlainValue(address)) return false;
+                content = Live::assign(content, "IPV6INIT", "yes");
+                content = Live::assign(content, "IPV6ADDR", address);
             }
-            content = Live::assign(content, key, entry);
+            content = Live::assign(content, key, setting);
             applied = true;
             return true;
         });

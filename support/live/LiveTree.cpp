@@ -18,17 +18,21 @@
 //                25  S    primary IPv4 address: the first not flagged      IPADDR
 //                         IFA_F_SECONDARY
 //                26  S    its mask, dotted                                 NETMASK
-//                27  S    primary IPv6 address: global scope before site   IPV6ADDR=address/prefix (the
-//                         scope, stable before temporary, deprecated or    prefix kept from the file or
-//                         tentative; link-local never                      the kernel, else 64)
-//               102  U    the prefix length of 27 (0 without one). IPv6    the prefix in IPV6ADDR
-//                         only, as the configuration service writes it;
-//                         the IPv4 prefix is the mask (26)
+//                27  S    the ifcfg file's IPV6ADDR as it stands, when     IPV6ADDR=<the value as given>,
+//                         it has one; else the primary IPv6 address:       IPV6INIT=yes, and PREFIX when
+//                         global scope before site scope, stable before    the file has none (the value's
+//                         temporary, deprecated or tentative; link-local   "/n", else 102, else 64);
+//                         never                                            empty removes IPV6ADDR, PREFIX
+//               102  U    with the file's IPV6ADDR: its PREFIX (leading    PREFIX=<n>, and IPV6ADDR from
+//                         digits, 0 without any); else the kernel's        27 when the file has none
+//                         prefix of 27 (0 without one). IPv6 only; the
+//                         IPv4 prefix is the mask (26)
 //                28  U    type of 27: 2 global unicast (2000::/3),         -
 //                         4 site-local (fec0::/10), 1 other (unique
 //                         local, ...), 0 no address
-//                96  U    families with an address (IPv4: 25; IPv6: 27):   -
-//                         1 IPv4, 2 IPv6, 3 both, 0 none
+//                96  U    families the kernel has an address of (IPv4:     -
+//                         25; IPv6: its primary address): 1 IPv4, 2 IPv6,
+//                         3 both, 0 none
 //                47  U    the same as 4096, 4097, 4098 (0 none)            -
 //               100  S    gateway of the lowest-metric IPv4 default route  GATEWAY
 //                         of the main table leaving through the interface
@@ -36,10 +40,12 @@
 //               123  U    IFF_UP: 1 up, 12 down                            1 up, 12 down, 9 down then up,
 //                                                                          on the kernel at once
 // Every endpoint carries every property; what the host lacks reads as "" or 0.
-// ifcfg writes are configuration for the interface's next start: the kernel, and so the node,
-// keeps its values until then (123 alone acts at once). A new ifcfg file starts with
-// DEVICE=<interface>; an IPv6 address also sets IPV6INIT=yes, without which the start-up scripts
-// ignore IPV6ADDR. An empty value removes the key. Values outside [A-Za-z0-9.:-_/%,@+] are refused.
+// ifcfg writes are configuration for the interface's next start: the kernel keeps its values until
+// then (123 alone acts at once), and so does the node, except 27 and 102: they read back from the
+// file what was written there, as the static setting data does (IPV6ADDR and PREFIX), so that a
+// setting applied twice is the same setting. 28 is the type of 27; 96 and 47 are the kernel's.
+// A new ifcfg file starts with DEVICE=<interface>, the name quoted as Nx::quoteValue says
+// (Nx/PropertyFile.h). An empty value removes the key. Values must be plain (isPlainValue).
 #include "LiveTree.h"
 
 #include <arpa/inet.h>
@@ -85,7 +91,7 @@ int ipv6Rank(const KernelAddress& address) {
 
 unsigned int ipv6Type(const std::string& text) {
     in6_addr address{};
-    if (inet_pton(AF_INET6, text.c_str(), &address) != 1) return 0;
+    if (inet_pton(AF_INET6, text.substr(0, text.find('/')).c_str(), &address) != 1) return 0;
     const unsigned char first = address.s6_addr[0];
     if ((first & 0xe0) == 0x20) return 2;                                    // 2000::/3
     if (first == 0xfe && (address.s6_addr[1] & 0xc0) == 0xc0) return 4;      // fec0::/10
@@ -102,13 +108,27 @@ std::string maskText(unsigned int prefix) {
     return text;
 }
 
-unsigned int originOf(const Interface& i, const HostState& host) {
-    const auto configured = host.bootProtocols.find(i.link->name);
-    if (configured != host.bootProtocols.end()) {
-        const std::string& protocol = configured->second;
-        if (protocol == "dhcp" || protocol == "bootp") return 1;
-        if (protocol == "static" || protocol == "none") return 3;
+// The key's value in the interface's ifcfg file, empty when either is missing.
+std::string fileValue(const HostState& host, const std::string& name, const std::string& key) {
+    const auto file = host.interfaceFiles.find(name);
+    if (file == host.interfaceFiles.end()) return std::string();
+    const auto found = file->second.find(key);
+    return found == file->second.end() ? std::string() : found->second;
+}
+
+// Leading decimal digits, as the static setting data reads PREFIX; 0 without any.
+unsigned int leadingNumber(const std::string& text) {
+    unsigned int number = 0;
+    for (std::size_t i = 0; i < text.size() && i < 6 && text[i] >= '0' && text[i] <= '9'; ++i) {
+        number = number * 10 + static_cast<unsigned int>(text[i] - '0');
     }
+    return number;
+}
+
+unsigned int originOf(const Interface& i, const HostState& host) {
+    const std::string protocol = fileValue(host, i.link->name, "BOOTPROTO");
+    if (protocol == "dhcp" || protocol == "bootp") return 1;
+    if (protocol == "static" || protocol == "none") return 3;
     const KernelAddress* primary = i.ipv4 ? i.ipv4 : i.ipv6;
     if (!primary) return 0;
     return (primary->flags & IFA_F_PERMANENT) ? 3 : 1;
@@ -141,13 +161,19 @@ void addInterface(HostModel::Tree& tree, int parent, const Interface& i, const H
     HostModel::Node& node = tree.nodes[static_cast<std::size_t>(index)];
     const bool v4 = i.ipv4 != nullptr;
     const bool v6 = i.ipv6 != nullptr;
+    std::string ipv6 = fileValue(host, name, "IPV6ADDR");
+    unsigned int prefix = leadingNumber(fileValue(host, name, "PREFIX"));
+    if (ipv6.empty()) {
+        ipv6 = v6 ? i.ipv6->text : std::string();
+        prefix = v6 ? i.ipv6->prefix : 0;
+    }
     readOnly(node, P::ElementName, PropertyValue::ofText(name));
     node.properties[P::AddressOrigin] = PropertyValue::ofNumber(originOf(i, host));
     node.properties[P::IPv4Address] = PropertyValue::ofText(v4 ? i.ipv4->text : std::string());
     node.properties[P::SubnetMask] = PropertyValue::ofText(v4 ? maskText(i.ipv4->prefix) : std::string());
-    node.properties[P::IPv6Address] = PropertyValue::ofText(v6 ? i.ipv6->text : std::string());
-    node.properties[P::PrefixLength] = PropertyValue::ofNumber(v6 ? i.ipv6->prefix : 0);
-    readOnly(node, P::IPv6AddressType, PropertyValue::ofNumber(v6 ? ipv6Type(i.ipv6->text) : 0));
+    node.properties[P::IPv6Address] = PropertyValue::ofText(ipv6);
+    node.properties[P::PrefixLength] = PropertyValue::ofNumber(prefix);
+    readOnly(node, P::IPv6AddressType, PropertyValue::ofNumber(ipv6Type(ipv6)));
     readOnly(node, P::IPVersion, PropertyValue::ofNumber((v4 ? 1u : 0u) | (v6 ? 2u : 0u)));
     readOnly(node, P::ProtocolIFType, PropertyValue::ofNumber(v4 && v6 ? 4098 : v6 ? 4097 : v4 ? 4096 : 0));
     node.properties[P::IPv4Gateway] = PropertyValue::ofText(i.gateway4 ? i.gateway4->gateway : std::string());

@@ -23,7 +23,7 @@ extern const char* const kEndpointName;
 struct HostState {
     std::string hostName;
     ResolverConfig resolver;
-    std::map<std::string, std::string> bootProtocols;  // interface -> BOOTPROTO
+    std::map<std::string, std::map<std::string, std::string>> interfaceFiles;  // interface -> its ifcfg file
     std::vector<std::string> bmcInterfaces;            // IPIF_BMC_INTERFACES, in order
 };
 

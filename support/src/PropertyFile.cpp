@@ -1,5 +1,7 @@
 #include "Nx/PropertyFile.h"
 
+#include <cstring>
+
 #include "Nx/String.h"
 
 namespace Nx {
@@ -14,13 +16,51 @@ std::string trim(const std::string& text) {
     return text.substr(first, last - first + 1);
 }
 
-std::string unquote(const std::string& value) {
-    if (value.size() >= 2 && (value.front() == '"' || value.front() == '\'') && value.back() == value.front())
-        return value.substr(1, value.size() - 2);
-    return value;
-}
+bool oneOf(const char* set, char c) { return c != '\0' && std::strchr(set, c) != nullptr; }
 
 }  // namespace
+
+bool isPlainValue(const std::string& value) {
+    for (const char c : value) {
+        const bool alnum = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9');
+        if (!alnum && !oneOf(".:-_/%,@+", c)) return false;
+    }
+    return true;
+}
+
+bool quoteValue(const std::string& value, std::string& written) {
+    if (value.find_first_of(std::string("\n\r\0", 3)) != std::string::npos) return false;
+    if (isPlainValue(value)) {
+        written = value;
+        return true;
+    }
+    written = "'";
+    for (const char c : value) written += c == '\'' ? std::string("'\\''") : std::string(1, c);
+    written += '\'';
+    return true;
+}
+
+std::string unquoteValue(const std::string& text) {
+    std::string value;
+    for (std::string::size_type i = 0; i < text.size(); ++i) {
+        if (text[i] == '\'') {
+            const std::string::size_type close = text.find('\'', i + 1);
+            if (close == std::string::npos) return text;
+            value.append(text, i + 1, close - i - 1);
+            i = close;
+        } else if (text[i] == '"') {
+            for (++i; i < text.size() && text[i] != '"'; ++i) {
+                if (text[i] == '\\' && i + 1 < text.size() && oneOf("\"\\$`", text[i + 1])) ++i;
+                value += text[i];
+            }
+            if (i == text.size()) return text;
+        } else {
+            if (text[i] == '\\' && i + 1 < text.size()) ++i;
+            value += text[i];
+        }
+    }
+    return value;
+}
 
 PropertyFile::PropertyFile(const File::Path& path) : path_(path) {}
 
@@ -41,7 +81,7 @@ bool PropertyFile::open(unsigned long /*mode: reading is the only use*/) {
         if (equals == std::string::npos) continue;
         std::string key = trim(line.substr(0, equals));
         // The first occurrence wins, as a reader scanning from the top would find it.
-        if (!key.empty()) values_.emplace(key, unquote(trim(line.substr(equals + 1))));
+        if (!key.empty()) values_.emplace(key, unquoteValue(trim(line.substr(equals + 1))));
     }
     open_ = true;
     return true;

@@ -4,6 +4,12 @@ namespace Nx {
 namespace {
 
 constexpr char32_t kReplacement = 0xFFFD;
+// A byte that is no part of valid UTF-8 becomes the lone low surrogate U+DC80..U+DCFF and turns
+// back into that byte, so that narrow text (file and interface names are bytes, not UTF-8) goes
+// to wide and back unchanged. Only bytes 0x80..0xFF are escaped: nothing ASCII can be made up.
+constexpr char32_t kEscapeBase = 0xDC00;
+
+bool isEscapedByte(char32_t c) { return c >= kEscapeBase + 0x80 && c <= kEscapeBase + 0xFF; }
 
 bool isScalar(char32_t c) { return c <= 0x10FFFF && (c < 0xD800 || c > 0xDFFF); }
 
@@ -43,7 +49,11 @@ std::string make_string(const std::wstring& text) {
                 }
             }
         }
-        appendUtf8(out, c);
+        if (isEscapedByte(c)) {
+            out += static_cast<char>(c - kEscapeBase);
+        } else {
+            appendUtf8(out, c);
+        }
     }
     return out;
 }
@@ -76,17 +86,17 @@ std::wstring make_wstring(const std::string& text) {
             length = 4;
             minimum = 0x10000;
         } else {
-            out += static_cast<wchar_t>(kReplacement);
+            out += static_cast<wchar_t>(kEscapeBase + lead);
             ++i;
             continue;
         }
         size_t j = 1;
         for (; j < length && i + j < size && (bytes[i + j] & 0xC0) == 0x80; ++j) c = (c << 6) | (bytes[i + j] & 0x3F);
-        // A truncated, overlong or out-of-range sequence yields one replacement character and
-        // decoding resumes at the first byte that did not belong to it.
+        // A truncated, overlong or out-of-range sequence: its lead byte is escaped and decoding
+        // resumes at the next byte (a continuation byte there is escaped in turn).
         if (j < length || c < minimum || !isScalar(c)) {
-            out += static_cast<wchar_t>(kReplacement);
-            i += j;
+            out += static_cast<wchar_t>(kEscapeBase + lead);
+            ++i;
             continue;
         }
         if constexpr (sizeof(wchar_t) == 2) {

@@ -154,17 +154,24 @@ TEST_F(LiveHost, InterfaceWritesPersistToIfcfgFilesAndRefusalsWriteNothing) {
     ASSERT_TRUE(write(P::IPv6Address, V::ofText("2001:db8:1::9")));  // the kernel's prefix (64) is kept
     EXPECT_EQ(slurp(ifcfg("va")),
               "# edited by hand\nDEVICE=va\nONBOOT=yes\nBOOTPROTO=dhcp\nIPADDR=10.1.0.9\nNETMASK=255.255.0.0\n"
-              "GATEWAY=10.1.0.254\nIPV6_DEFAULTGW=fe80::1%va\nIPV6INIT=yes\nIPV6ADDR=2001:db8:1::9/64\n");
+              "GATEWAY=10.1.0.254\nIPV6_DEFAULTGW=fe80::1%va\nIPV6INIT=yes\nIPV6ADDR=2001:db8:1::9\nPREFIX=64\n");
     ASSERT_TRUE(write(P::PrefixLength, V::ofNumber(56)));
     ASSERT_TRUE(write(P::IPv4Gateway, V::ofText("")));  // empty removes the key
     ASSERT_TRUE(write(P::AddressOrigin, V::ofNumber(3)));
     EXPECT_EQ(slurp(ifcfg("va")),
               "# edited by hand\nDEVICE=va\nONBOOT=yes\nBOOTPROTO=static\nIPADDR=10.1.0.9\nNETMASK=255.255.0.0\n"
-              "IPV6_DEFAULTGW=fe80::1%va\nIPV6INIT=yes\nIPV6ADDR=2001:db8:1::9/56\n");
-    ASSERT_TRUE(write(P::IPv6Address, V::ofText("2001:db8:1::a/60")));
-    EXPECT_NE(slurp(ifcfg("va")).find("\nIPV6ADDR=2001:db8:1::a/60\n"), std::string::npos);
-    // The files are configuration for the next start: the kernel keeps what it has.
-    EXPECT_EQ(text(endpoint(*backend().snapshot(), "va"), P::IPv4Address), "10.1.0.2");
+              "IPV6_DEFAULTGW=fe80::1%va\nIPV6INIT=yes\nIPV6ADDR=2001:db8:1::9\nPREFIX=56\n");
+    ASSERT_TRUE(write(P::IPv6Address, V::ofText("2001:db8:1::a/60")));  // brings its prefix
+    EXPECT_NE(slurp(ifcfg("va")).find("\nIPV6ADDR=2001:db8:1::a/60\nPREFIX=60\n"), std::string::npos);
+    // The files are configuration for the next start: the kernel keeps what it has, and the node
+    // shows it, but for the IPv6 address and prefix, which read back as written.
+    const Node* node = endpoint(*backend().snapshot(), "va");
+    EXPECT_EQ(text(node, P::IPv4Address), "10.1.0.2");
+    EXPECT_EQ(text(node, P::IPv6Address) + " " + std::to_string(number(node, P::PrefixLength)), "2001:db8:1::a/60 60");
+    ASSERT_TRUE(write(P::IPv6Address, V::ofText("")));  // removes the address with its prefix
+    EXPECT_EQ(slurp(ifcfg("va")).find("PREFIX"), std::string::npos);
+    node = endpoint(*backend().snapshot(), "va");
+    EXPECT_EQ(text(node, P::IPv6Address) + " " + std::to_string(number(node, P::PrefixLength)), "2001:db8:1::2 64");
 
     // A new file names its device; a prefix without any IPv6 address to carry it is refused.
     const std::string vb = endpoint(*backend().snapshot(), "vb")->path;

@@ -121,4 +121,14 @@ TEST_F(ConfigurationFileTest, PathsFitTheBufferOrAreRefused) {
     EXPECT_EQ(path, "unchanged");
 }
 
+TEST_F(ConfigurationFileTest, NamesThatAreNotUtf8ReadTheFileTheyWrote) {
+    testfiles::ScopedEnv env("IPIF_DATA_DIR", dir.path());
+    std::string path, value;
+    ASSERT_TRUE(configurationFilePath("e\xff\xfe", path));
+    ASSERT_TRUE(updateConfigurationValue(path, "CONFIG_NAME", "lab"));
+    EXPECT_EQ(readFile(dir.path() + "/ifcfg-e\xff\xfe"), "CONFIG_NAME=lab\n");
+    ASSERT_TRUE(readConfigurationValue(path, "CONFIG_NAME", value));
+    EXPECT_EQ(value, "lab");
+}
+
 }  // namespace

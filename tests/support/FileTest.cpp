@@ -160,13 +160,22 @@ TEST(PropertyFile, ReadsKeyValueLines) {
     EXPECT_FALSE(Nx::File::exists(dir.file("ifcfg-none")));
 }
 
-TEST(String, Utf8ConversionsRoundTripAndReplaceBadBytes) {
+TEST(String, Utf8ConversionsRoundTripAndKeepBadBytes) {
     const std::string text = "eth0 Gr\xC3\xBC\xC3\x9F" "e \xE2\x82\xAC \xF0\x9D\x84\x9E";
     const std::wstring wide = Nx::make_wstring(text);
     EXPECT_EQ(wide, L"eth0 Gr\u00fc\u00dfe \u20ac \U0001D11E");
     EXPECT_EQ(Nx::make_string(wide), text);
-    // A stray continuation byte, a truncated sequence, an overlong '/' and an encoded surrogate.
-    EXPECT_EQ(Nx::make_wstring("a\x80" "b\xE2\x82" "c\xC0\xAF" "d\xED\xA0\x80"), L"a\uFFFDb\uFFFDc\uFFFDd\uFFFD");
+    // A stray continuation byte, a truncated sequence, an overlong '/' and an encoded surrogate:
+    // each byte of them stands as U+DC80..U+DCFF and comes back as itself.
+    const std::string bad = "a\x80" "b\xE2\x82" "c\xC0\xAF" "d\xED\xA0\x80" "e\xFF";
+    const std::wstring escaped = Nx::make_wstring(bad);
+    EXPECT_EQ(escaped.substr(0, 6), std::wstring({L'a', wchar_t(0xDC80), L'b', wchar_t(0xDCE2), wchar_t(0xDC82), L'c'}));
+    EXPECT_EQ(Nx::make_string(escaped), bad);
+    std::string every;
+    for (int c = 1; c < 256; ++c) every += static_cast<char>(c);
+    EXPECT_EQ(Nx::make_string(Nx::make_wstring(every + text + bad)), every + text + bad);
+    // Only those code points become bytes: other lone surrogates still become U+FFFD.
     EXPECT_EQ(Nx::make_string(std::wstring(1, static_cast<wchar_t>(0xD800))), "\xEF\xBF\xBD");
+    EXPECT_EQ(Nx::make_string(std::wstring(1, static_cast<wchar_t>(0xDC7F))), "\xEF\xBF\xBD");
     EXPECT_EQ(Nx::make_string(L""), "");
 }

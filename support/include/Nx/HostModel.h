@@ -53,7 +53,8 @@ public:
     // property is read-only, the value has the wrong kind, or the host refused the change.
     // Snapshots taken after a successful write show the new value, except where the host applies
     // it later: on the live host an interface's addresses, mask, gateways and prefix are written to
-    // its ifcfg file and take effect at the interface's next start.
+    // its ifcfg file and take effect at the interface's next start (the IPv6 address and prefix
+    // read back from the file at once).
     virtual bool write(const std::string& nodePath, unsigned int property, const PropertyValue& value) = 0;
     // "fixture:<path>" or "live", for diagnostics.
     virtual std::string describe() const = 0;
