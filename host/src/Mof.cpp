@@ -459,7 +459,8 @@ void ClassRepository::addText(const std::string& text, const std::string& fileNa
 
 void ClassRepository::addFile(const std::string& path) {
     std::string text;
-    if (!detail::readFile(path, text)) throw MofError(path + ":0: cannot open file");
+    std::string error;
+    if (!Nx::File::read(path, text, error)) throw MofError(path + ":0: " + error);
     addText(text, path);
 }
 

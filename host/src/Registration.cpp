@@ -99,7 +99,8 @@ std::vector<Registration> loadRegistrations(const std::string& path) {
     std::vector<Registration> all;
     for (const auto& f : files) {
         std::string text;
-        if (!detail::readFile(f, text)) throw RegistrationError(f + ":0: cannot open file");
+        std::string error;
+        if (!Nx::File::read(f, text, error)) throw RegistrationError(f + ":0: " + error);
         auto regs = parseRegistrations(text, f);
         all.insert(all.end(), regs.begin(), regs.end());
     }

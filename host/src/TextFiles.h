@@ -1,4 +1,5 @@
-// Reading the host's text inputs (MOF and registration files). Not installed; host sources only.
+// Finding the host's text inputs (MOF and registration files), which Nx::File::read reads. Not
+// installed; host sources only.
 #pragma once
 
 #include <dirent.h>
@@ -6,11 +7,10 @@
 
 #include <algorithm>
 #include <cctype>
-#include <fstream>
-#include <sstream>
 #include <string>
 #include <vector>
 
+#include "Nx/File.h"
 #include "ipif/Value.h"
 
 namespace ipif {
@@ -21,16 +21,6 @@ inline std::string trim(const std::string& s) {
     while (b < e && std::isspace(static_cast<unsigned char>(s[b]))) ++b;
     while (e > b && std::isspace(static_cast<unsigned char>(s[e - 1]))) --e;
     return s.substr(b, e - b);
-}
-
-// A whole file. False when it cannot be opened.
-inline bool readFile(const std::string& path, std::string& content) {
-    std::ifstream in(path, std::ios::binary);
-    if (!in) return false;
-    std::ostringstream ss;
-    ss << in.rdbuf();
-    content = ss.str();
-    return true;
 }
 
 // The files a path names: the path itself, or a directory's entries whose names end in suffix

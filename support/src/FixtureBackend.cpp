@@ -3,14 +3,11 @@
 // line of the written property is rewritten.
 #include "Nx/FixtureBackend.h"
 
-#include <fcntl.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
 #include <cerrno>
 #include <climits>
 #include <cstdlib>
-#include <cstring>
 #include <map>
 #include <mutex>
 #include <utility>
@@ -352,6 +349,7 @@ public:
 
         bool written = false;
         try {
+            // The fixture lies wherever the user keeps it, not under IPIF_ROOT.
             written = File::update(path_, [&](std::string& content, bool exists) {
                 if (!exists) return false;
                 Document doc = parseDocument(content, path_);
@@ -368,7 +366,7 @@ public:
                                        line.tail;
                 content = doc.render();
                 return true;
-            });
+            }, File::Scope::Named);
         } catch (const std::exception& error) {
             logFailure(error.what());
             return false;
@@ -385,24 +383,16 @@ public:
 private:
     // Re-reads the file when it is not the one last read. Caller holds mutex_ (or is the constructor).
     bool reload(std::string* error) {
-        int fd = ::open(path_.c_str(), O_RDONLY | O_CLOEXEC);
-        if (fd < 0) {
-            *error = path_ + ": cannot open the host model fixture: " + std::strerror(errno);
-            return false;
-        }
-        // Stamp and content come from the same open file, so they always belong together.
         struct stat info;
-        std::string content;
-        bool readable = ::fstat(fd, &info) == 0;
-        const Stamp stamp = readable ? Stamp::of(info) : Stamp();
-        const bool unchanged = readable && tree_ && stamp == stamp_;
-        if (readable && !unchanged) readable = readAll(fd, content);
-        ::close(fd);
-        if (!readable) {
-            *error = path_ + ": cannot read the host model fixture: " + std::strerror(errno);
+        if (tree_ && ::stat(path_.c_str(), &info) == 0 && Stamp::of(info) == stamp_) return true;
+        // Stamp and content come from the same open file, so they always belong together.
+        std::string content, reason;
+        if (!File::read(path_, content, reason, &info)) {
+            *error = path_ + ": cannot read the host model fixture: " + reason;
             return false;
         }
-        if (unchanged) return true;
+        const Stamp stamp = Stamp::of(info);
+        if (tree_ && stamp == stamp_) return true;
         try {
             tree_ = std::make_shared<const Tree>(parseDocument(content, path_).tree);
         } catch (const std::exception& parseError) {
@@ -411,17 +401,6 @@ private:
         }
         stamp_ = stamp;
         return true;
-    }
-
-    static bool readAll(int fd, std::string& content) {
-        char buffer[8192];
-        for (;;) {
-            ssize_t n = ::read(fd, buffer, sizeof buffer);
-            if (n < 0 && errno == EINTR) continue;
-            if (n < 0) return false;
-            if (n == 0) return true;
-            content.append(buffer, static_cast<size_t>(n));
-        }
     }
 
     const std::string path_;
@@ -459,10 +438,14 @@ std::string formatFixture(const Tree& tree) {
 }
 
 std::shared_ptr<Backend> openFixtureBackend(const std::string& path) {
+    // Keep working on the same file when the process later changes directory. Only the directory
+    // is resolved: a fixture that is a link stays one, so writes refuse it rather than follow it.
+    const std::string::size_type slash = path.rfind('/');
+    const std::string directory = slash == std::string::npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
     char resolved[PATH_MAX];
-    // Keep working on the same file when the process later changes directory.
-    std::string absolute = ::realpath(path.c_str(), resolved) ? std::string(resolved) : path;
-    return std::make_shared<FixtureBackend>(absolute);
+    if (::realpath(directory.c_str(), resolved) == nullptr) return std::make_shared<FixtureBackend>(path);
+    const std::string base = path.substr(slash == std::string::npos ? 0 : slash + 1);
+    return std::make_shared<FixtureBackend>(std::string(resolved) == "/" ? "/" + base : resolved + ("/" + base));
 }
 
 }  // namespace HostModel

@@ -7,10 +7,10 @@
 #include <cerrno>
 #include <cstdio>
 #include <cstdlib>
-#include <fstream>
 #include <memory>
 #include <mutex>
 
+#include "Nx/File.h"
 #include "Trace.h"
 
 namespace Nx {
@@ -80,8 +80,12 @@ Mode commandMode(std::string& recordPath) {
 void recordedAnswer(const std::string& command, std::string& output) {
     const std::string answers = environment("IPIF_COMMAND_ANSWERS");
     if (answers.empty()) return;
-    std::ifstream file(answers);
-    for (std::string line; std::getline(file, line);) {
+    std::string content;
+    if (!File::read(answers, content)) return;
+    for (std::string::size_type start = 0, end; start < content.size(); start = end + 1) {
+        end = content.find('\n', start);
+        if (end == std::string::npos) end = content.size();
+        const std::string line = content.substr(start, end - start);
         const auto tab = line.find('\t');
         if (tab == command.size() && line.compare(0, tab, command) == 0) {
             output = line.substr(tab + 1) + "\n";

@@ -1,10 +1,13 @@
 // The MOF reader, the class repository, registration files, and the project's own MOF.
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cctype>
 #include <cstring>
 #include <filesystem>
+#include <fstream>
+#include <functional>
 #include <iterator>
 #include <map>
 #include <regex>
@@ -98,6 +101,26 @@ TEST(Mof, SyntaxErrorsNameFileAndLine) {
             EXPECT_EQ(std::string(e.what()).rfind(c.expected, 0), 0u) << e.what();
         }
     }
+}
+
+TEST(Mof, OnlyRegularFilesOfBoundedSizeAreRead) {
+    testfiles::ScratchDir dir;
+    const std::string device = dir.file("null.mof"), big = dir.file("big.mof");
+    ASSERT_EQ(::symlink("/dev/null", device.c_str()), 0);
+    std::ofstream(big).close();
+    ASSERT_EQ(::truncate(big.c_str(), (16 << 20) + 1), 0);
+    const auto failure = [](const std::function<void()>& load) {
+        try {
+            load();
+        } catch (const std::exception& e) {
+            return std::string(e.what());
+        }
+        return std::string();
+    };
+    ClassRepository repo;
+    EXPECT_EQ(failure([&] { repo.addFile(device); }), device + ":0: not a regular file");
+    EXPECT_EQ(failure([&] { repo.addFile(big); }), big + ":0: larger than 16 MiB");
+    EXPECT_EQ(failure([&] { loadRegistrations(device); }), device + ":0: not a regular file");
 }
 
 TEST(Mof, RepositoryResolvesInheritanceAndRejectsDanglingNames) {

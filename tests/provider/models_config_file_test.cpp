@@ -5,6 +5,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <filesystem>
 #include <string>
 #include <thread>
 #include <vector>
@@ -103,6 +104,10 @@ TEST_F(ConfigurationFileTest, ConcurrentWritersLoseNoUpdate) {
         for (int t = 0; t < 3; ++t)
             for (int k = 0; k < 10; ++k)
                 EXPECT_NE(content.find(key(p, t, k) + "=" + std::to_string(k) + "\n"), std::string::npos);
+    // Neither a lock file nor a temporary stays behind.
+    std::vector<std::string> left;
+    for (const auto& entry : std::filesystem::directory_iterator(dir.path())) left.push_back(entry.path().filename());
+    EXPECT_EQ(left, std::vector<std::string>{"ifcfg-eth0"});
 }
 
 TEST_F(ConfigurationFileTest, PathsFitTheBufferOrAreRefused) {

@@ -1,10 +1,15 @@
+#include <fcntl.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <atomic>
+#include <fstream>
 #include <thread>
 
+#include "Nx/Exceptions.h"
+#include "Nx/HostModel.h"
 #include "Nx/PropertyFile.h"
 #include "Nx/String.h"
 #include "SupportTestUtil.h"
@@ -82,8 +87,8 @@ TEST(File, UpdateLosesNothingUnderThreadsAndProcesses) {
     EXPECT_EQ(torn, 0);
     const std::string expected = std::to_string(perWriter * (threads + processes)) + kFiller;
     EXPECT_TRUE(slurp(path) == expected) << "counter at " << std::atol(slurp(path).c_str());
-    // Only the file and its lock are left: no temporary survived.
-    EXPECT_EQ(entries(dir), (std::vector<std::string>{".counter.lock", "counter"}));
+    // Only the file is left: no temporary survived and the lock went with its last holder.
+    EXPECT_EQ(entries(dir), (std::vector<std::string>{"counter"}));
 
     // A declined edit leaves the file alone.
     EXPECT_FALSE(Nx::File::update(path, [](std::string& content, bool) {
@@ -112,15 +117,113 @@ TEST(File, WriteAtomicallyKeepsTheOldFileOnAnyFailure) {
     EXPECT_EQ(slurp(path), "NEW=2\n");
     EXPECT_EQ(modeOf(path), 0600u);  // the replaced file keeps its mode
 
-    // Through a symbolic link the target changes and the link stays a link.
-    const std::string link = dir.file("resolv.conf");
-    ASSERT_EQ(::symlink(path.c_str(), link.c_str()), 0);
-    ASSERT_TRUE(Nx::File::writeAtomically(link, "VIA=link\n"));
-    EXPECT_TRUE(std::filesystem::is_symlink(link));
-    EXPECT_EQ(slurp(path), "VIA=link\n");
-
     EXPECT_FALSE(Nx::File::writeAtomically(dir.file("missing/dir/file"), "x"));
     EXPECT_FALSE(Nx::File::writeAtomically(dir.path(), "x"));  // a directory is not replaced
+}
+
+TEST(File, WritesNeitherFollowLinksNorLeaveTheRoot) {
+    ScratchDir dir;
+    const std::string root = dir.file("root"), outside = dir.file("outside");
+    ASSERT_TRUE(std::filesystem::create_directory(root) && std::filesystem::create_directory(outside));
+    const std::string target = outside + "/target";
+    ASSERT_TRUE(Nx::File::writeAtomically(target, "OUT\n"));
+    ScopedEnv rootEnv("IPIF_ROOT", root);
+    ScopedEnv dataEnv("IPIF_DATA_DIR", "");
+
+    // A linked file is neither written through nor replaced, by any call or scope; reading follows it.
+    const std::string link = root + "/ifcfg-eth0";
+    ASSERT_EQ(::symlink(target.c_str(), link.c_str()), 0);
+    bool edited = false;
+    const auto edit = [&](std::string& content, bool) {
+        edited = true;
+        content = "X\n";
+        return true;
+    };
+    EXPECT_FALSE(Nx::File::writeAtomically(link, "X\n"));
+    EXPECT_FALSE(Nx::File::writeAtomically(link, "X\n", Nx::File::Scope::Named));
+    EXPECT_FALSE(Nx::File::update(link, edit));
+    EXPECT_FALSE(edited);
+    EXPECT_TRUE(std::filesystem::is_symlink(link));
+    EXPECT_EQ(slurp(link), "OUT\n");
+
+    // A planted lock link leads nowhere: update refuses rather than create its target.
+    const std::string lockLink = root + "/.ifcfg-eth1.lock";
+    ASSERT_EQ(::symlink((outside + "/created").c_str(), lockLink.c_str()), 0);
+    EXPECT_FALSE(Nx::File::update(root + "/ifcfg-eth1", edit));
+    EXPECT_FALSE(std::filesystem::exists(outside + "/created"));
+
+    // Outside the root, directly or through a linked directory, host files are not written; an
+    // IPIF_DATA_DIR set elsewhere and a file named outright are.
+    ASSERT_EQ(::symlink(outside.c_str(), (root + "/etc").c_str()), 0);
+    EXPECT_FALSE(Nx::File::writeAtomically(outside + "/hostname", "h\n"));
+    EXPECT_FALSE(Nx::File::update(root + "/etc/hostname", edit));
+    EXPECT_FALSE(std::filesystem::exists(outside + "/hostname"));
+    EXPECT_TRUE(Nx::File::writeAtomically(root + "/hostname", "h\n"));
+    EXPECT_TRUE(Nx::File::writeAtomically(outside + "/model", "m\n", Nx::File::Scope::Named));
+    ScopedEnv elsewhere("IPIF_DATA_DIR", outside);
+    EXPECT_TRUE(Nx::File::update(outside + "/ifcfg-eth2", edit));
+}
+
+TEST(File, WritersRemoveOnlyTheTemporariesDeadWritersLeft) {
+    ScratchDir dir;
+    const std::string path = dir.file("ifcfg-eth0");
+    ASSERT_TRUE(Nx::File::writeAtomically(path, "A\n"));
+    const auto plant = [&](const std::string& name, time_t age) {
+        const std::string file = dir.file(name);
+        std::ofstream(file) << "half";
+        const struct timespec times[2] = {{0, UTIME_OMIT}, {::time(nullptr) - age, 0}};
+        ASSERT_EQ(::utimensat(AT_FDCWD, file.c_str(), times, 0), 0);
+    };
+    plant(".ifcfg-eth0.dead01", 3600);  // a killed writer's
+    plant(".ifcfg-eth0.young1", 0);     // a writer's that has yet to lock it
+    plant(".ifcfg-eth0.busy01", 3600);  // a slow writer's, locked
+    plant(".ifcfg-eth1.dead02", 3600);  // another file's
+    const int busy = ::open(dir.file(".ifcfg-eth0.busy01").c_str(), O_RDONLY | O_CLOEXEC);
+    ASSERT_EQ(::flock(busy, LOCK_EX), 0);
+    EXPECT_TRUE(Nx::File::writeAtomically(path, "B\n"));
+    ::close(busy);
+    EXPECT_EQ(entries(dir), (std::vector<std::string>{".ifcfg-eth0.busy01", ".ifcfg-eth0.young1",
+                                                      ".ifcfg-eth1.dead02", "ifcfg-eth0"}));
+    EXPECT_EQ(slurp(path), "B\n");
+}
+
+TEST(File, ReadsOnlyRegularFilesUpToTheCap) {
+    ScratchDir dir;
+    std::string content = "kept", error;
+    const std::string device = dir.file("ifcfg-null");
+    ASSERT_EQ(::symlink("/dev/null", device.c_str()), 0);
+    EXPECT_FALSE(Nx::File::read(device, content, error));
+    EXPECT_EQ(error, "not a regular file");
+    EXPECT_EQ(content, "kept");
+    try {
+        Nx::HostModel::open("fixture:" + device);
+        ADD_FAILURE() << "a device taken for a fixture";
+    } catch (const Nx::InstrumentationException& e) {
+        EXPECT_NE(std::string(e.what()).find("not a regular file"), std::string::npos) << e.what();
+    }
+
+    // A FIFO would wait for a writer forever: the child must come back refused in time.
+    const std::string fifo = dir.file("host.model");
+    ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
+    const pid_t child = ::fork();
+    ASSERT_GE(child, 0);
+    if (child == 0) {
+        ::alarm(5);
+        std::string text, why;
+        ::_exit(!Nx::File::read(fifo, text, why) && why == "not a regular file" ? 0 : 1);
+    }
+    int status = 0;
+    ASSERT_EQ(::waitpid(child, &status, 0), child);
+    EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0) << "status " << status;
+
+    const std::string big = dir.file("big");
+    std::ofstream(big).close();
+    for (std::size_t size : {Nx::File::kMaxReadSize, Nx::File::kMaxReadSize + 1}) {
+        ASSERT_EQ(::truncate(big.c_str(), static_cast<off_t>(size)), 0);
+        EXPECT_EQ(Nx::File::read(big, content, error), size == Nx::File::kMaxReadSize) << size;
+    }
+    EXPECT_EQ(content.size(), Nx::File::kMaxReadSize);
+    EXPECT_EQ(error, "larger than 16 MiB");
 }
 
 TEST(PropertyFile, ReadsKeyValueLines) {

@@ -165,6 +165,14 @@ TEST(FixtureBackend, WriteRewritesOnlyThePropertyLineAndKeepsComments) {
     EXPECT_EQ(changed, 2);
     auto tree = backend->snapshot();
     EXPECT_EQ(tree->nodes[0].properties.at(94).list, (std::vector<std::string>{"192.0.2.99", "a \"quoted\" one"}));
+
+    // A fixture named through a link is read through it, but never written through it.
+    const std::string link = dir.file("linked.model");
+    ASSERT_EQ(::symlink(path.c_str(), link.c_str()), 0);
+    auto linked = Nx::HostModel::open("fixture:" + link);
+    EXPECT_EQ(linked->snapshot()->nodes.size(), tree->nodes.size());
+    EXPECT_FALSE(linked->write("/host/eth0/ip", 24, PropertyValue::ofNumber(3)));
+    EXPECT_EQ(lines(slurp(path)), after);
 }
 
 TEST(Instrumentation, WalksNodesOfOneTypeAndFollowsPaths) {
