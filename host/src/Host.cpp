@@ -67,6 +67,17 @@ CMPIStatus callProvider(HostImpl* h, F&& f) {
     }
 }
 
+// Calls a factory found with dlsym through its exact type (a call through any other type is
+// undefined): the generic one if there is one, else the provider's own.
+template <class MI>
+MI* createMI(void* genericSym, void* specificSym, const CMPIBroker* broker, const CMPIContext* ctx,
+             const char* providerName, CMPIStatus* st) {
+    using Generic = MI* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
+    using Specific = MI* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+    if (genericSym) return reinterpret_cast<Generic>(genericSym)(broker, ctx, providerName, st);
+    return reinterpret_cast<Specific>(specificSym)(broker, ctx, st);
+}
+
 Result failure(int rc, const std::string& message) {
     Result r;
     r.rc = rc;
@@ -289,12 +300,13 @@ void* Host::Impl::miFor(Provider& p, Kind kind, std::string& error) {
     if (genericSym || specificSym) {
         CMPIContext* ctx = newContext(options.defaultNamespace, nullptr);
         CMPIStatus thrown = callProvider(this, [&]() -> CMPIStatus {
-            using Generic = void* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
-            using Specific = void* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-            if (genericSym)
-                mi = reinterpret_cast<Generic>(genericSym)(&broker, ctx, p.name.c_str(), &st);
+            const char* name = p.name.c_str();
+            if (kind == Kind::Instance)
+                mi = createMI<CMPIInstanceMI>(genericSym, specificSym, &broker, ctx, name, &st);
+            else if (kind == Kind::Association)
+                mi = createMI<CMPIAssociationMI>(genericSym, specificSym, &broker, ctx, name, &st);
             else
-                mi = reinterpret_cast<Specific>(specificSym)(&broker, ctx, &st);
+                mi = createMI<CMPIMethodMI>(genericSym, specificSym, &broker, ctx, name, &st);
             return okStatus();
         });
         if (thrown.rc != CMPI_RC_OK) st = thrown;
