@@ -85,6 +85,15 @@ Result failure(int rc, const std::string& message) {
     return r;
 }
 
+// The host serves the namespaces its registrations name; a request for any other fails with
+// CMPI_RC_ERR_INVALID_NAMESPACE (set in result, and true returned).
+bool unknownNamespace(const std::vector<Registration>& regs, const std::string& ns, Result& result) {
+    if (std::any_of(regs.begin(), regs.end(), [&](const Registration& r) { return r.servesNamespace(ns); }))
+        return false;
+    result = failure(CMPI_RC_ERR_INVALID_NAMESPACE, "unknown namespace " + ns);
+    return true;
+}
+
 }  // namespace
 
 std::vector<std::string> HostOptions::splitList(const std::string& list) {
@@ -397,6 +406,7 @@ MI* Host::Impl::miOf(Provider& p, Kind kind, Result& result) {
 template <class MI>
 MI* Host::Impl::serving(const ObjectPath& path, Kind kind, CMPIrc none, Result& result) {
     std::string ns = nameSpaceOf(path);
+    if (unknownNamespace(regs, ns, result)) return nullptr;
     if (!repo.exists(path.className)) {
         result = failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
         return nullptr;
@@ -411,6 +421,8 @@ MI* Host::Impl::serving(const ObjectPath& path, Kind kind, CMPIrc none, Result& 
 Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std::vector<std::string>* props,
                              const NamedValues* ctx) {
     std::string ns = nameSpaceOf(classPath);
+    Result result;
+    if (unknownNamespace(regs, ns, result)) return result;
     if (!repo.exists(classPath.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + classPath.className);
     std::vector<const Registration*> targets;
     for (const auto& r : regs) {
@@ -419,7 +431,6 @@ Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std:
                                 [&](const Registration* t) { return equalsIgnoreCase(t->className, r.className); });
         if (!seen) targets.push_back(&r);
     }
-    Result result;
     for (const Registration* reg : targets) {
         auto* mi = miOf<CMPIInstanceMI>(*providerOf(*reg), Kind::Instance, result);
         if (!mi) return result;
@@ -486,6 +497,8 @@ Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& 
                          const std::string& resultClass, const std::string& role, const std::string& resultRole,
                          const std::vector<std::string>* props, const NamedValues* ctx) {
     std::string ns = nameSpaceOf(path);
+    Result result;
+    if (unknownNamespace(regs, ns, result)) return result;
     if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
     bool associators = op == AssocOp::Associators || op == AssocOp::AssociatorNames;
     const std::string& filter = associators ? assocClass : resultClass;
@@ -519,7 +532,6 @@ Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& 
 
     ObjectPath full = path;
     full.nameSpace = ns;
-    Result result;
     for (auto& group : groups) {
         auto* mi = miOf<CMPIAssociationMI>(*group.first, Kind::Association, result);
         if (!mi) return result;
