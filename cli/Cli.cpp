@@ -1,13 +1,16 @@
 #include "Cli.h"
 
 #include <cmath>
+#include <cstdint>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 #include <exception>
 #include <iostream>
 #include <memory>
 #include <sstream>
 
+#include "Nx/HostModel.h"
 #include "ipif/Host.h"
 
 namespace ipif {
@@ -47,8 +50,11 @@ const char* kUsage =
     "  -h, --help           this text\n"
     "\n"
     "Output: instances as 'instance of Class { Prop = value; };', paths one per line, and for\n"
-    "cm 'ReturnValue = N;' followed by one 'Name = value;' line per out argument.\n"
-    "Exit status: 0 ok, 1 command line rejected, 2 the request failed with a CMPI status.\n";
+    "cm 'ReturnValue = N;' followed by one 'Name = value;' line per out argument. Control\n"
+    "characters and bytes that are not UTF-8 are escaped (\\n, \\x1B; \\u001b in JSON).\n"
+    "Exit status: 0 ok; 1 the command line, MOF, registrations or host model were rejected;\n"
+    "2 the request failed with a CMPI status; 3 cm: the method returned a nonzero ReturnValue.\n"
+    "Every error is one line on stderr; what a request produced is printed all the same.\n";
 
 // An error with its exit code; rc < 0 means a plain usage message.
 struct Failure {
@@ -120,26 +126,68 @@ Options parseOptions(const std::vector<std::string>& args) {
 
 // ---- Output --------------------------------------------------------------------------------
 
-std::string jsonString(const std::string& s) {
-    std::string out = "\"";
-    for (unsigned char c : s) {
-        switch (c) {
-        case '"': out += "\\\""; break;
-        case '\\': out += "\\\\"; break;
-        case '\n': out += "\\n"; break;
-        case '\t': out += "\\t"; break;
-        case '\r': out += "\\r"; break;
-        default:
-            if (c < 0x20) {
-                char buf[8];
-                std::snprintf(buf, sizeof buf, "\\u%04x", c);
-                out += buf;
-            } else {
-                out += static_cast<char>(c);
-            }
+// Length (1 to 4) of the well-formed UTF-8 character at s[i], or 0 when the byte there starts
+// none: a stray continuation byte, an overlong form, a surrogate, beyond U+10FFFF or cut short.
+std::size_t utf8Length(const std::string& s, std::size_t i, std::uint32_t& cp) {
+    unsigned char c = static_cast<unsigned char>(s[i]);
+    std::size_t n = c < 0x80 ? 1 : (c & 0xE0) == 0xC0 ? 2 : (c & 0xF0) == 0xE0 ? 3 : (c & 0xF8) == 0xF0 ? 4 : 0;
+    if (n == 0 || i + n > s.size()) return 0;
+    cp = n == 1 ? c : c & (0x7F >> n);
+    for (std::size_t k = 1; k < n; ++k) {
+        unsigned char d = static_cast<unsigned char>(s[i + k]);
+        if ((d & 0xC0) != 0x80) return 0;
+        cp = cp << 6 | (d & 0x3F);
+    }
+    static const std::uint32_t least[] = {0, 0, 0x80, 0x800, 0x10000};
+    if (cp < least[n] || cp > 0x10FFFF || (cp >= 0xD800 && cp <= 0xDFFF)) return 0;
+    return n;
+}
+
+// s with each control character (C0, DEL, C1), each character of extra and each byte that is
+// not part of well-formed UTF-8 replaced by escape(value): the code point, or the byte itself.
+template <class Escape>
+std::string escapeText(const std::string& s, const char* extra, Escape escape) {
+    std::string out;
+    out.reserve(s.size());
+    for (std::size_t i = 0; i < s.size();) {
+        std::uint32_t cp = 0;
+        std::size_t n = utf8Length(s, i, cp);
+        if (n == 0) {
+            out += escape(static_cast<unsigned char>(s[i]));
+            ++i;
+        } else if (cp < 0x20 || (cp >= 0x7F && cp <= 0x9F) || (cp < 0x80 && std::strchr(extra, s[i]))) {
+            out += escape(cp);
+            i += n;
+        } else {
+            out.append(s, i, n);
+            i += n;
         }
     }
-    return out + "\"";
+    return out;
+}
+
+// One escaped character or byte: \n, \t, \r, \" and \\, else \u00XX (JSON) or \xXX.
+std::string escapeOne(std::uint32_t c, bool json) {
+    if (c == '\n') return "\\n";
+    if (c == '\t') return "\\t";
+    if (c == '\r') return "\\r";
+    if (c == '"' || c == '\\') return std::string("\\") + static_cast<char>(c);
+    char buf[12];
+    std::snprintf(buf, sizeof buf, json ? "\\u%04x" : "\\x%02X", static_cast<unsigned>(c));
+    return buf;
+}
+
+// Text for the terminal: nothing from a host or the command line moves the cursor or starts a
+// terminal sequence. \xHH as MOF strings spell it.
+std::string printable(const std::string& s) {
+    return escapeText(s, "", [](std::uint32_t c) { return escapeOne(c, false); });
+}
+
+// A JSON string that is valid whatever the bytes: control characters are escaped, and a byte
+// that is not part of well-formed UTF-8 becomes \u00XX, the code point of the same number (so
+// "e\xff" reads back as "e\u00ff").
+std::string jsonString(const std::string& s) {
+    return "\"" + escapeText(s, "\"\\", [](std::uint32_t c) { return escapeOne(c, true); }) + "\"";
 }
 
 std::string jsonInstance(const Instance& inst);
@@ -198,7 +246,13 @@ void printInstances(const std::vector<Instance>& instances, bool json, std::ostr
         out << "]\n";
         return;
     }
-    for (std::size_t i = 0; i < instances.size(); ++i) out << (i ? "\n" : "") << instances[i].toMof();
+    for (std::size_t i = 0; i < instances.size(); ++i) {
+        // Instance::toMof's layout, with names and values made printable.
+        out << (i ? "\n" : "") << "instance of " << printable(instances[i].className()) << " {\n";
+        for (const auto& p : instances[i].properties)
+            out << "    " << printable(p.first) << " = " << printable(p.second.toText()) << ";\n";
+        out << "};\n";
+    }
 }
 
 void printPaths(const std::vector<ObjectPath>& paths, bool json, std::ostream& out) {
@@ -208,7 +262,7 @@ void printPaths(const std::vector<ObjectPath>& paths, bool json, std::ostream& o
         out << "]\n";
         return;
     }
-    for (const auto& p : paths) out << p.toString() << "\n";
+    for (const auto& p : paths) out << printable(p.toString()) << "\n";
 }
 
 // ---- Command arguments ---------------------------------------------------------------------
@@ -335,6 +389,12 @@ void need(const Options& o, std::size_t min, std::size_t max, const char* form) 
     if (n < min || n > max) usage(std::string("usage: ipif ") + form);
 }
 
+bool nonzeroInteger(const Value& v) {
+    if (v.isNull() || v.isArray()) return false;
+    const Element& e = v.elements()[0];
+    return (e.index() == 2 && std::get<std::uint64_t>(e) != 0) || (e.index() == 3 && std::get<std::int64_t>(e) != 0);
+}
+
 // Prints what a request produced, then fails with its status when it has one.
 void finish(const Result& r) {
     if (!r.ok()) throw Failure{2, r.rc, r.message};
@@ -424,17 +484,33 @@ void dispatch(Host& host, const Options& o, std::ostream& out) {
             out << "{\"ReturnValue\": " << (r.hasReturnValue ? jsonValue(r.returnValue) : "null")
                 << ", \"outArgs\": " << jsonNamed(r.outArgs) << "}\n";
         } else {
-            if (r.hasReturnValue) out << "ReturnValue = " << r.returnValue.toText() << ";\n";
-            for (const auto& arg : r.outArgs) out << arg.first << " = " << arg.second.toText() << ";\n";
+            if (r.hasReturnValue) out << "ReturnValue = " << printable(r.returnValue.toText()) << ";\n";
+            for (const auto& arg : r.outArgs)
+                out << printable(arg.first) << " = " << printable(arg.second.toText()) << ";\n";
         }
         finish(r);
+        if (r.hasReturnValue && nonzeroInteger(r.returnValue))
+            throw Failure{3, -1, p.className + "." + a[2] + " returned " + r.returnValue.toText()};
     } else {
         usage("unknown command '" + cmd + "'");
     }
 }
 
+// The providers treat a host model they cannot open as a host with nothing on it; a command
+// line that names one is refused instead.
+void checkHostModel() {
+    const char* selector = std::getenv("IPIF_HOST_MODEL");
+    if (!selector || !*selector || std::string(selector) == "live") return;
+    try {
+        Nx::HostModel::open(selector);
+    } catch (const std::exception& e) {
+        throw Failure{1, -1, std::string("host model: ") + e.what()};
+    }
+}
+
 int execute(const Options& o, std::ostream& out, std::ostream& err) {
     if (o.hostModelSet) setenv("IPIF_HOST_MODEL", o.hostModel.c_str(), 1);
+    checkHostModel();
     HostOptions ho;
     ho.mofPaths = o.mofs;
     ho.regPaths = o.regs;
@@ -476,9 +552,7 @@ int run(const std::vector<std::string>& args, std::ostream& out, std::ostream& e
         return execute(o, out, err);
     } catch (const Failure& f) {
         out.flush();
-        std::string msg = f.message;
-        for (auto& c : msg)
-            if (c == '\n' || c == '\r') c = ' ';
+        std::string msg = printable(f.message);
         if (f.rc < 0)
             err << "ipif: error: " << msg << "\n";
         else
@@ -487,7 +561,7 @@ int run(const std::vector<std::string>& args, std::ostream& out, std::ostream& e
         return f.exitCode;
     } catch (const std::exception& e) {
         out.flush();
-        err << "ipif: error: " << e.what() << "\n";
+        err << "ipif: error: " << printable(e.what()) << "\n";
         return 1;
     }
 }

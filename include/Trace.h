@@ -9,7 +9,9 @@
 
 namespace Nx {
 
-enum MessageType { ENTERING = 0, EXITING = 1, METHOD_INVOKED = 2, FREE_MESSAGE = 3 };
+// Fixed to int so that any int a caller passes is a value of the type (the helpers give an
+// unknown one empty text); without it a value beyond 0..3 would be undefined.
+enum MessageType : int { ENTERING = 0, EXITING = 1, METHOD_INVOKED = 2, FREE_MESSAGE = 3 };
 
 // Each helper formats into a 512-byte buffer of its own (one per thread) and returns it; the text
 // stays valid until the same helper is called again on the same thread. Over-long texts are cut.

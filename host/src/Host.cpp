@@ -61,11 +61,31 @@ CMPIStatus callProvider(HostImpl* h, F&& f) {
     }
 }
 
+// Calls a factory found with dlsym through its exact type (a call through any other type is
+// undefined): the generic one if there is one, else the provider's own.
+template <class MI>
+MI* createMI(void* genericSym, void* specificSym, const CMPIBroker* broker, const CMPIContext* ctx,
+             const char* providerName, CMPIStatus* st) {
+    using Generic = MI* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
+    using Specific = MI* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
+    if (genericSym) return reinterpret_cast<Generic>(genericSym)(broker, ctx, providerName, st);
+    return reinterpret_cast<Specific>(specificSym)(broker, ctx, st);
+}
+
 Result failure(int rc, const std::string& message) {
     Result r;
     r.rc = rc;
     r.message = message;
     return r;
+}
+
+// The host serves the namespaces its registrations name; a request for any other fails with
+// CMPI_RC_ERR_INVALID_NAMESPACE (set in result, and true returned).
+bool unknownNamespace(const std::vector<Registration>& regs, const std::string& ns, Result& result) {
+    if (std::any_of(regs.begin(), regs.end(), [&](const Registration& r) { return r.servesNamespace(ns); }))
+        return false;
+    result = failure(CMPI_RC_ERR_INVALID_NAMESPACE, "unknown namespace " + ns);
+    return true;
 }
 
 }  // namespace
@@ -283,12 +303,13 @@ void* Host::Impl::miFor(Provider& p, Kind kind, std::string& error) {
     if (genericSym || specificSym) {
         CMPIContext* ctx = newContext(options.defaultNamespace, nullptr);
         CMPIStatus thrown = callProvider(this, [&]() -> CMPIStatus {
-            using Generic = void* (*)(const CMPIBroker*, const CMPIContext*, const char*, CMPIStatus*);
-            using Specific = void* (*)(const CMPIBroker*, const CMPIContext*, CMPIStatus*);
-            if (genericSym)
-                mi = reinterpret_cast<Generic>(genericSym)(&broker, ctx, p.name.c_str(), &st);
+            const char* name = p.name.c_str();
+            if (kind == Kind::Instance)
+                mi = createMI<CMPIInstanceMI>(genericSym, specificSym, &broker, ctx, name, &st);
+            else if (kind == Kind::Association)
+                mi = createMI<CMPIAssociationMI>(genericSym, specificSym, &broker, ctx, name, &st);
             else
-                mi = reinterpret_cast<Specific>(specificSym)(&broker, ctx, &st);
+                mi = createMI<CMPIMethodMI>(genericSym, specificSym, &broker, ctx, name, &st);
             return okStatus();
         });
         if (thrown.rc != CMPI_RC_OK) st = thrown;
@@ -379,6 +400,7 @@ MI* Host::Impl::miOf(Provider& p, Kind kind, Result& result) {
 template <class MI>
 MI* Host::Impl::serving(const ObjectPath& path, Kind kind, CMPIrc none, Result& result) {
     std::string ns = nameSpaceOf(path);
+    if (unknownNamespace(regs, ns, result)) return nullptr;
     if (!repo.exists(path.className)) {
         result = failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
         return nullptr;
@@ -393,6 +415,8 @@ MI* Host::Impl::serving(const ObjectPath& path, Kind kind, CMPIrc none, Result& 
 Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std::vector<std::string>* props,
                              const NamedValues* ctx) {
     std::string ns = nameSpaceOf(classPath);
+    Result result;
+    if (unknownNamespace(regs, ns, result)) return result;
     if (!repo.exists(classPath.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + classPath.className);
     std::vector<const Registration*> targets;
     for (const auto& r : regs) {
@@ -401,7 +425,6 @@ Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std:
                                 [&](const Registration* t) { return equalsIgnoreCase(t->className, r.className); });
         if (!seen) targets.push_back(&r);
     }
-    Result result;
     for (const Registration* reg : targets) {
         auto* mi = miOf<CMPIInstanceMI>(*providerOf(*reg), Kind::Instance, result);
         if (!mi) return result;
@@ -468,6 +491,8 @@ Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& 
                          const std::string& resultClass, const std::string& role, const std::string& resultRole,
                          const std::vector<std::string>* props, const NamedValues* ctx) {
     std::string ns = nameSpaceOf(path);
+    Result result;
+    if (unknownNamespace(regs, ns, result)) return result;
     if (!repo.exists(path.className)) return failure(CMPI_RC_ERR_INVALID_CLASS, "unknown class " + path.className);
     bool associators = op == AssocOp::Associators || op == AssocOp::AssociatorNames;
     const std::string& filter = associators ? assocClass : resultClass;
@@ -501,7 +526,6 @@ Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& 
 
     ObjectPath full = path;
     full.nameSpace = ns;
-    Result result;
     for (auto& group : groups) {
         auto* mi = miOf<CMPIAssociationMI>(*group.first, Kind::Association, result);
         if (!mi) return result;

@@ -32,10 +32,13 @@ std::string slurp(const std::string& path) {
     return ss.str();
 }
 
-// Runs ipif over the test MOF and providers (unless raw) with the given arguments.
-Outcome runIpif(const std::vector<std::string>& args, bool raw = false) {
+void writeFile(const std::string& path, const std::string& text) { std::ofstream(path) << text; }
+
+// Runs ipif over the test MOF and providers (unless raw: the project's MOF and providers) with
+// the given arguments and environment assignments.
+Outcome runIpif(const std::vector<std::string>& args, bool raw = false, const std::string& env = "") {
     std::string base = testing::TempDir() + "/ipif-cli-" + std::to_string(getpid());
-    std::string cmd = "IPIF_PROVIDER_PATH=" + shellQuote(IPIF_TEST_PROVIDER_DIR) + " " + shellQuote(IPIF_CLI);
+    std::string cmd = env + " IPIF_PROVIDER_PATH=" + shellQuote(IPIF_TEST_PROVIDER_DIR) + " " + shellQuote(IPIF_CLI);
     if (!raw)
         cmd += " --mof " + shellQuote(IPIF_HOST_TEST_DIR "/test.mof") + " --reg " +
                shellQuote(IPIF_HOST_TEST_DIR "/test.reg");
@@ -154,7 +157,7 @@ TEST(Cli, ErrorsAreOneLineWithTheirExitCode) {
         {{"cm", kW1, "Resize", "Bogus=1"}, 1, "ipif: error: rc 4 (CMPI_RC_ERR_INVALID_PARAMETER): method IPIFTEST_Widget.Resize has no parameter Bogus"},
         {{"ai", kW1, "-ac", "IPIFTEST_Nope"}, 1, "ipif: error: rc 5 (CMPI_RC_ERR_INVALID_CLASS): unknown class IPIFTEST_Nope (-ac)"},
         {{"gi", "IPIFTEST_Widget.InstanceID=\"none\""}, 2, "ipif: error: rc 6 (CMPI_RC_ERR_NOT_FOUND): no such widget"},
-        {{"cm", kW1, "Fail"}, 2, "ipif: error: rc 2 (CMPI_RC_ERR_ACCESS_DENIED): denied by the widget"},
+        {{"cm", kW1, "Fail"}, 2, "ipif: error: rc 2 (CMPI_RC_ERR_ACCESS_DENIED): denied\\nby the widget"},
         {{"cm", kW1, "Throw"}, 2, "ipif: error: rc 1 (CMPI_RC_ERR_FAILED): provider threw: widget exploded"},
         {{"mi", kW1, "Size=5000"}, 2, "ipif: error: rc 4 (CMPI_RC_ERR_INVALID_PARAMETER): Size too large"},
         {{"frobnicate", kW1}, 1, "ipif: error: unknown command 'frobnicate'"},
@@ -167,6 +170,17 @@ TEST(Cli, ErrorsAreOneLineWithTheirExitCode) {
         {{"--bogus", "ei", "X"}, 1, "ipif: error: unknown option --bogus"},
         {{"ai", kW1, "-ac"}, 1, "ipif: error: option -ac needs a value"},
         {{}, 1, "ipif: error: no command given"},
+        {{"cm", kW1, "Deep", "Levels=2"}, 3, "ipif: error: IPIFTEST_Widget.Deep returned 2\n"},
+        {{"ein", "root/nope:IPIFTEST_Widget"}, 2, "ipif: error: rc 3 (CMPI_RC_ERR_INVALID_NAMESPACE): unknown namespace root/nope\n"},
+        {{"--namespace", "root/nope", "gi", kW1}, 2, "ipif: error: rc 3 (CMPI_RC_ERR_INVALID_NAMESPACE)"},
+        {{"ain", std::string("root/nope:") + kW1}, 2, "ipif: error: rc 3 (CMPI_RC_ERR_INVALID_NAMESPACE)"},
+        {{"--host-model", "fixture:/nonexistent", "ei", "IPIFTEST_Widget"}, 1,
+         "ipif: error: host model: /nonexistent: cannot open the host model fixture"},
+        {{"--host-model", "fixture:/", "ei", "IPIFTEST_Widget"}, 1, "ipif: error: host model: /: "},
+        {{"--host-model", "bogus", "ei", "IPIFTEST_Widget"}, 1, "ipif: error: host model: unknown host model selector"},
+        // Control characters from the command line come back escaped.
+        {{"gi\x1b[2J\r"}, 1, "ipif: error: unknown command 'gi\\x1B[2J\\r'"},
+        {{"ei", "IPIFTEST_\x7f\nNope\x9b"}, 1, "ipif: error: rc 4 (CMPI_RC_ERR_INVALID_PARAMETER): "},
     };
     for (const auto& c : cases) {
         Outcome r = runIpif(c.args);
@@ -174,12 +188,23 @@ TEST(Cli, ErrorsAreOneLineWithTheirExitCode) {
         EXPECT_EQ(r.exit, c.exit) << what << ": " << r.err;
         EXPECT_EQ(r.err.rfind(c.err, 0), 0u) << what << ": " << r.err;
         EXPECT_EQ(lines(r.err), 1) << what << ": " << r.err;
+        for (unsigned char ch : r.err.substr(0, r.err.size() - 1)) EXPECT_TRUE(ch >= 0x20 && ch < 0x7f) << r.err;
     }
 
     // The return value and out arguments still print when the status is an error.
     Outcome partial = runIpif({"cm", kW1, "Resize", "NewSize:uint32=1"});
     EXPECT_EQ(partial.exit, 2);
     EXPECT_EQ(partial.out, "ReturnValue = 4;\n");
+    EXPECT_EQ(runIpif({"cm", kW1, "Deep", "Levels=2"}).out, "ReturnValue = 2;\n");
+
+    std::string badModel = testing::TempDir() + "/ipif-cli-bad-" + std::to_string(getpid()) + ".model";
+    writeFile(badModel, "node 40 host\n  97 strin x\n");
+    Outcome model = runIpif({"ein", "IPIFTEST_Widget"}, false, "IPIF_HOST_MODEL=fixture:" + shellQuote(badModel));
+    EXPECT_EQ(model.exit, 1);
+    EXPECT_EQ(model.err.rfind("ipif: error: host model: /", 0), 0u) << model.err;
+    EXPECT_NE(model.err.find(".model:2: unknown property kind \"strin\""), std::string::npos) << model.err;
+    EXPECT_EQ(model.out, "");
+    std::remove(badModel.c_str());
 
     Outcome help = runIpif({"--help"}, true);
     EXPECT_EQ(help.exit, 0);
@@ -213,4 +238,37 @@ TEST(Cli, OddInputNeverCrashes) {
         EXPECT_TRUE(r.exit == 0 || r.exit == 1 || r.exit == 2) << args[0] << " " << (args.size() > 1 ? args[1] : "");
         EXPECT_LE(lines(r.err), 1) << r.err;
     }
+}
+
+// A host whose interface name holds an invalid UTF-8 byte, terminal controls, an escaped newline
+// and a valid two-byte character: text output escapes what is not printable, JSON stays valid.
+TEST(Cli, OddBytesInNamesAreEscaped) {
+    const std::string odd = "e\xff\x1b]0;x\x07\\n\xc3\xbc";  // the fixture's quoted spelling
+    std::string model = testing::TempDir() + "/ipif-cli-odd-" + std::to_string(getpid()) + ".model";
+    writeFile(model, "node 40 host Host\n  97 string h\n  node 12 p0 \"" + odd + "\"\n    108 string \"" + odd +
+                         "\"\n    node 29 ip \"" + odd + "\"\n      24 unsigned 3\n      47 unsigned 4096\n"
+                         "      96 unsigned 1\n      108 string \"" + odd + "\"\n      123 unsigned 1\n");
+    const std::string env = "IPIF_HOST_MODEL=fixture:" + shellQuote(model);
+    for (const char* cmd : {"ein", "ei"}) {
+        Outcome text = runIpif({cmd, "KVRNX_IPProtocolEndpoint"}, true, env);
+        ASSERT_EQ(text.exit, 0) << text.err;
+        EXPECT_NE(text.out.find("e\\xFF\\x1B]0;x\\x07\\n\xc3\xbc"), std::string::npos) << text.out;
+        for (unsigned char c : text.out) EXPECT_TRUE(c == '\n' || (c >= 0x20 && c != 0x7f)) << cmd << ": " << int(c);
+        if (std::string(cmd) == "ein") {
+            EXPECT_EQ(lines(text.out), 1) << text.out;
+        }
+
+        Outcome json = runIpif({"--json", cmd, "KVRNX_IPProtocolEndpoint"}, true, env);
+        ASSERT_EQ(json.exit, 0) << json.err;
+        EXPECT_NE(json.out.find("e\\u00ff\\u001b]0;x\\u0007\\n\xc3\xbc"), std::string::npos) << json.out;
+        std::string file = model + ".json";
+        writeFile(file, json.out);
+        std::string check = "python3 -c 'import json, sys\n"
+                            "def refuse(name): raise ValueError(name)\n"
+                            "json.loads(sys.stdin.buffer.read().decode(\"utf-8\"), parse_constant=refuse)' <" +
+                            shellQuote(file);
+        EXPECT_EQ(std::system(check.c_str()), 0) << json.out;
+        std::remove(file.c_str());
+    }
+    std::remove(model.c_str());
 }

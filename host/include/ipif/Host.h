@@ -34,7 +34,8 @@
 //     class as the filter. A filter naming a class the MOF does not know goes to every
 //     association provider of the namespace unchanged (the provider decides). Role, result
 //     role and result class are passed on; the host does not post-filter results.
-// Registrations naming a class the MOF does not declare are kept but never routed to.
+// Registrations naming a class the MOF does not declare are kept but never routed to. A
+// namespace no registration names is CMPI_RC_ERR_INVALID_NAMESPACE for every operation.
 // Paths given to the API are typed through the MOF (ClassRepository::typedPath) before they
 // reach a provider; an empty namespace means HostOptions::defaultNamespace.
 //
