@@ -175,7 +175,7 @@ TEST(Cli, ErrorsAreOneLineWithTheirExitCode) {
         {{"--namespace", "root/nope", "gi", kW1}, 2, "ipif: error: rc 3 (CMPI_RC_ERR_INVALID_NAMESPACE)"},
         {{"ain", std::string("root/nope:") + kW1}, 2, "ipif: error: rc 3 (CMPI_RC_ERR_INVALID_NAMESPACE)"},
         {{"--host-model", "fixture:/nonexistent", "ei", "IPIFTEST_Widget"}, 1,
-         "ipif: error: host model: /nonexistent: cannot open the host model fixture"},
+         "ipif: error: host model: /nonexistent: cannot read the host model fixture"},
         {{"--host-model", "fixture:/", "ei", "IPIFTEST_Widget"}, 1, "ipif: error: host model: /: "},
         {{"--host-model", "bogus", "ei", "IPIFTEST_Widget"}, 1, "ipif: error: host model: unknown host model selector"},
         // Control characters from the command line come back escaped.
