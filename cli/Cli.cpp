@@ -10,6 +10,7 @@
 #include <memory>
 #include <sstream>
 
+#include "TALog/TALogger.h"
 #include "Nx/HostModel.h"
 #include "ipif/Host.h"
 
@@ -511,6 +512,8 @@ void checkHostModel() {
 int execute(const Options& o, std::ostream& out, std::ostream& err) {
     if (o.hostModelSet) setenv("IPIF_HOST_MODEL", o.hostModel.c_str(), 1);
     checkHostModel();
+    // A provider inside an object manager can only report a bad log setting; a command can refuse it.
+    if (std::string bad = TALog::TALogger::configurationError(); !bad.empty()) throw Failure{1, -1, bad};
     HostOptions ho;
     ho.mofPaths = o.mofs;
     ho.regPaths = o.regs;

@@ -191,6 +191,11 @@ TEST(Cli, ErrorsAreOneLineWithTheirExitCode) {
         for (unsigned char ch : r.err.substr(0, r.err.size() - 1)) EXPECT_TRUE(ch >= 0x20 && ch < 0x7f) << r.err;
     }
 
+    Outcome loud = runIpif({"ein", "IPIFTEST_Widget"}, false, "IPIF_LOG_FILE=/dev/null IPIF_LOG_LEVEL=loud");
+    EXPECT_EQ(loud.exit, 1);
+    EXPECT_EQ(loud.err.rfind("ipif: error: IPIF_LOG_LEVEL=\"loud\" is not a level", 0), 0u) << loud.err;
+    EXPECT_EQ(loud.out, "");
+
     // The return value and out arguments still print when the status is an error.
     Outcome partial = runIpif({"cm", kW1, "Resize", "NewSize:uint32=1"});
     EXPECT_EQ(partial.exit, 2);
