@@ -10,8 +10,8 @@
 #include <memory>
 #include <sstream>
 
-#include "TALog/TALogger.h"
 #include "Nx/HostModel.h"
+#include "TALog/TALogger.h"
 #include "ipif/Host.h"
 
 namespace ipif {
