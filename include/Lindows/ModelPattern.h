@@ -19,7 +19,6 @@
 
 #include "Nx/Instrumentation.h"
 #include "Nx/NodeLexicon.h"
-#include "TALog/TAMessageBuffer.h"
 #include "Trace.h"
 
 namespace Nx {
@@ -72,11 +71,12 @@ protected:
     // around body, whose answer it returns.
     template <class Body>
     static bool traced(const Site& at, Body body) {
-        record(at, 4000, trace(at.file, at.function, at.line, ENTERING));
+        if (tracing(4000)) record(at, 4000, trace(at.file, at.function, at.line, ENTERING));
         const bool answered = body();
-        record(at, 4000, trace(at.file, at.function, at.line, EXITING));
+        if (tracing(4000)) record(at, 4000, trace(at.file, at.function, at.line, EXITING));
         return answered;
     }
+    // Callers check tracing(level) before they format text.
     static void record(const Site& at, int level, const char* text) {
         logRecord(Derived::logger(), at.function, at.file, at.line, level, text);
     }
@@ -112,7 +112,7 @@ protected:
                 return true;
             }
             if (localHostName(name)) return true;
-            record(at, 6000, trace(at.file, "gethostname Failed", at.line, FREE_MESSAGE));
+            if (tracing(6000)) record(at, 6000, trace(at.file, "gethostname Failed", at.line, FREE_MESSAGE));
             return false;
         });
     }
@@ -127,9 +127,7 @@ private:
 
 template <class Derived, class Keys, Nx::NodeLexicon::NodeType NodeTypeV>
 void ModelPattern<Derived, Keys, NodeTypeV>::setFilter(FilterType filterType, const std::string& reference) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " filterType=" << static_cast<int>(filterType) << " reference=" << reference;
-    const std::string list = parameters.str();
+    const TraceParams list(" filterType=", static_cast<int>(filterType), " reference=", reference);
     NX_ENTER_PARAMS(Derived::logger(), list.c_str());
 
     filterSet = true;
