@@ -336,12 +336,27 @@ std::string rcName(int rc) {
     return "CMPI_RC_" + std::to_string(rc);
 }
 
-bool equalsIgnoreCase(const std::string& a, const std::string& b) {
+namespace {
+
+// ASCII only: CIM names are ASCII, and the result must not depend on the locale.
+inline unsigned char folded(char c) {
+    const auto u = static_cast<unsigned char>(c);
+    return u >= 'A' && u <= 'Z' ? static_cast<unsigned char>(u + ('a' - 'A')) : u;
+}
+
+}  // namespace
+
+bool equalsIgnoreCase(std::string_view a, std::string_view b) {
     if (a.size() != b.size()) return false;
     for (std::size_t i = 0; i < a.size(); ++i)
-        if (std::tolower(static_cast<unsigned char>(a[i])) != std::tolower(static_cast<unsigned char>(b[i])))
-            return false;
+        if (folded(a[i]) != folded(b[i])) return false;
     return true;
+}
+
+std::size_t HashIgnoreCase::operator()(std::string_view name) const {
+    std::size_t hash = 14695981039346656037ull;  // FNV-1a
+    for (char c : name) hash = (hash ^ folded(c)) * 1099511628211ull;
+    return hash;
 }
 
 std::string quote(const std::string& text, bool mof) {
@@ -509,19 +524,19 @@ bool Value::operator==(const Value& other) const {
 
 // ---- NamedValues ---------------------------------------------------------------------------
 
-const Value* NamedValues::find(const std::string& name) const {
+const Value* NamedValues::find(std::string_view name) const {
     for (const auto& item : items_)
         if (equalsIgnoreCase(item.first, name)) return &item.second;
     return nullptr;
 }
 
-Value* NamedValues::find(const std::string& name) {
+Value* NamedValues::find(std::string_view name) {
     for (auto& item : items_)
         if (equalsIgnoreCase(item.first, name)) return &item.second;
     return nullptr;
 }
 
-void NamedValues::set(const std::string& name, Value value) {
+void NamedValues::set(std::string_view name, Value value) {
     if (Value* v = find(name)) {
         *v = std::move(value);
         return;
@@ -529,7 +544,7 @@ void NamedValues::set(const std::string& name, Value value) {
     items_.emplace_back(name, std::move(value));
 }
 
-bool NamedValues::erase(const std::string& name) {
+bool NamedValues::erase(std::string_view name) {
     for (auto it = items_.begin(); it != items_.end(); ++it)
         if (equalsIgnoreCase(it->first, name)) {
             items_.erase(it);
