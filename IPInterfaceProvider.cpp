@@ -261,6 +261,7 @@ CMPIStatus IPInterface_MethodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBool
 
 CMPIStatus IPInterface_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                          const CMPIObjectPath* cop) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status =
         serveInstances(ctx, rslt, cop, false, [&](auto& adapter) { returnObjectPath(rslt, adapter.getObjectPath()); });
@@ -270,6 +271,7 @@ CMPIStatus IPInterface_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* ctx
 
 CMPIStatus IPInterface_EnumInstances(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                      const CMPIObjectPath* cop, const char** properties) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveInstances(
         ctx, rslt, cop, false, [&](auto& adapter) { returnInstance(rslt, adapter.getCMPIInstance(properties)); });
@@ -279,6 +281,7 @@ CMPIStatus IPInterface_EnumInstances(CMPIInstanceMI*, const CMPIContext* ctx, co
 
 CMPIStatus IPInterface_GetInstance(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                    const CMPIObjectPath* cop, const char** properties) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveInstances(
         ctx, rslt, cop, true, [&](auto& adapter) { returnInstance(rslt, adapter.getCMPIInstance(properties)); });
@@ -288,6 +291,7 @@ CMPIStatus IPInterface_GetInstance(CMPIInstanceMI*, const CMPIContext* ctx, cons
 
 CMPIStatus IPInterface_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
                                       const CMPIInstance*) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
     EXIT_MARK();
@@ -296,6 +300,7 @@ CMPIStatus IPInterface_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const
 
 CMPIStatus IPInterface_ModifyInstance(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                       const CMPIObjectPath* cop, const CMPIInstance* ci, const char**) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     try {
@@ -330,6 +335,7 @@ CMPIStatus IPInterface_ExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPI
 CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                   const CMPIObjectPath* cop, const char* resultClass, const char*,
                                   const char** properties) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveReferences(ctx, rslt, cop, resultClass, [&](auto& adapter) {
         returnInstance(rslt, adapter.getCMPIInstance(properties));
@@ -340,6 +346,7 @@ CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext* ctx, co
 
 CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                       const CMPIObjectPath* cop, const char* resultClass, const char*) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveReferences(ctx, rslt, cop, resultClass,
                                         [&](auto& adapter) { returnObjectPath(rslt, adapter.getObjectPath()); });
@@ -350,6 +357,7 @@ CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext* ctx
 CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                    const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
                                    const char*, const char*, const char** properties) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveAssociators(ctx, rslt, cop, assocClass, resultClass, [&](auto& adapter) {
         returnInstance(rslt, adapter.getAssociator(properties));
@@ -361,6 +369,7 @@ CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext* ctx, c
 CMPIStatus IPInterface_AssociatorNames(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                        const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
                                        const char*, const char*) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveAssociators(ctx, rslt, cop, assocClass, resultClass, [&](auto& adapter) {
         returnObjectPath(rslt, adapter.getAssociatorNames());
@@ -372,6 +381,7 @@ CMPIStatus IPInterface_AssociatorNames(CMPIAssociationMI*, const CMPIContext* ct
 CMPIStatus IPInterface_InvokeMethod(CMPIMethodMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                     const CMPIObjectPath* cop, const char* method, const CMPIArgs* in,
                                     CMPIArgs* out) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIUint32 ret = 0;

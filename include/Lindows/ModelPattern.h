@@ -32,8 +32,31 @@ struct Site {
 };
 #define NX_SITE (::Nx::IPInterfaceProvider::Site{__func__, NX_FILE, __LINE__})
 
-// The host name from gethostname. False when gethostname fails.
+// The host name from gethostname; false (name untouched) when gethostname fails. Within a
+// RequestScope the system is asked once and every later call gets the same answer.
 bool localHostName(std::string& name);
+
+// One provider request on this thread, from the entry point until it returns. The host name may
+// change between requests, never within one. Scopes nest (an up-call that comes back into the
+// provider belongs to the outer request).
+class RequestScope {
+public:
+    RequestScope();
+    ~RequestScope();
+    RequestScope(const RequestScope&) = delete;
+    RequestScope& operator=(const RequestScope&) = delete;
+
+    // The request itself has changed the host name: the next localHostName asks the system.
+    static void hostNameChanged();
+
+private:
+    friend bool localHostName(std::string& name);
+
+    RequestScope* const outer_;  // null for the outermost scope, which holds what was learnt
+    bool asked_ = false;
+    bool known_ = false;  // gethostname succeeded
+    std::string hostName_;
+};
 
 template <class Derived, class Keys, Nx::NodeLexicon::NodeType NodeTypeV = Nx::NodeLexicon::IPEndpointNode>
 class ModelPattern : public Keys {

@@ -1,5 +1,10 @@
 // The IP protocol endpoint model and the filter/walk pattern it shares with the other models.
+#include <sched.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
 #include <array>
+#include <cstring>
 #include <string>
 #include <utility>
 #include <vector>
@@ -138,6 +143,42 @@ TEST_F(EndpointModel, AddressOriginTableAndRoundTrips) {
         endpoint.getAddressOrigin(origin);
         EXPECT_EQ(origin, readBack) << written;
     }
+}
+
+// The host name is read once per request (in a UTS namespace of a child's own): a rename during
+// the request shows from the next request on, or at once when the request made it itself.
+TEST_F(EndpointModel, SystemNameIsReadOncePerRequest) {
+    using Nx::IPInterfaceProvider::RequestScope;
+    testhost::ScopedHostModel model(host);
+    const pid_t child = ::fork();
+    ASSERT_GE(child, 0);
+    if (child == 0) {
+        if (::unshare(CLONE_NEWUTS) != 0) ::_exit(99);
+        const auto rename = [](const char* name) { return ::sethostname(name, std::strlen(name)) == 0; };
+        const auto systemName = [] {
+            std::string name;
+            IPprotocolEndpoint().getSystemName(name);
+            return name;
+        };
+        int wrong = !rename("first");
+        {
+            const RequestScope request;
+            wrong |= (systemName() != "first") << 1;
+            wrong |= !rename("second") << 2;
+            const RequestScope upcall;
+            wrong |= (systemName() != "first") << 3;
+            RequestScope::hostNameChanged();
+            wrong |= (systemName() != "second") << 4;
+            wrong |= !rename("third") << 5;
+        }
+        wrong |= (systemName() != "third") << 6;
+        ::_exit(wrong);
+    }
+    int status = 0;
+    ASSERT_EQ(::waitpid(child, &status, 0), child);
+    ASSERT_TRUE(WIFEXITED(status));
+    if (WEXITSTATUS(status) == 99) GTEST_SKIP() << "no UTS namespace here";
+    EXPECT_EQ(WEXITSTATUS(status), 0) << "bit set per failed check";
 }
 
 }  // namespace
