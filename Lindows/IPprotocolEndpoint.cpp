@@ -23,6 +23,12 @@ bool IPprotocolEndpoint::filterHolds(const Filter& filter) {
     return true;
 }
 
+void IPprotocolEndpoint::skipRejected(const Filter& filter) {
+    // ByName compares the element name as getName reads it; the host model skips exactly the
+    // endpoints whose readable name differs.
+    if (filter.filterType == ByName) instrumentation.seek(Properties::ElementName, filter.reference);
+}
+
 bool IPprotocolEndpoint::onServiceProcessor() const {
     return instrumentation.getNodeDescription().find("BMC ") != std::string::npos;
 }

@@ -6,10 +6,9 @@ namespace Nx {
 namespace IPInterfaceProvider {
 
 bool isUnderServiceProcessor(const Nx::Instrumentation& cursor) {
-    // A copy shares the host model, so walking it upwards leaves the caller's position alone.
+    // A copy shares the cursor's picture, so walking it upwards leaves the caller's position alone.
     Nx::Instrumentation probe(cursor);
-    if (!probe.selectNode(cursor.getPathToParentNode())) return false;
-    if (!probe.selectNode(probe.getPathToParentNode())) return false;
+    if (!probe.selectParent() || !probe.selectParent()) return false;
     return probe.getNodeDescription() == "BMC";
 }
 

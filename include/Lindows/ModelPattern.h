@@ -9,6 +9,9 @@
 //   bool filterHolds(const Filter& filter);   one filter against the current object
 // and may replace:
 //   void advance();                           step to the next object (default: next node)
+//   void skipRejected(const Filter& filter);  move forward past objects the filter certainly
+//                                             rejects, never past one it may accept (default:
+//                                             stay; the walk then evaluates every object)
 // Keys supplies the class's FilterType enumeration (with a fixed underlying type, so that a
 // filter type outside the enumeration can be stored; such a filter always holds).
 #pragma once
@@ -89,6 +92,7 @@ protected:
     ~ModelPattern() = default;
 
     void advance() { ++instrumentation; }
+    void skipRejected(const Filter&) {}
 
     // A getter's work, traced as the getter at: its ENTERING and EXITING lines (level 4000)
     // around body, whose answer it returns.
@@ -146,6 +150,10 @@ protected:
 
 private:
     Derived& self() { return static_cast<Derived&>(*this); }
+    // Lets each filter move the walk past what it rejects.
+    void skipRejected() {
+        for (const Filter& filter : filters) self().skipRejected(filter);
+    }
 };
 
 template <class Derived, class Keys, Nx::NodeLexicon::NodeType NodeTypeV>
@@ -157,6 +165,8 @@ void ModelPattern<Derived, Keys, NodeTypeV>::setFilter(FilterType filterType, co
     filters.push_back(Filter{filterType, reference});
     bool passed = false;
     while (instrumentation && !passed) {
+        skipRejected();
+        if (!instrumentation) break;
         passed = evaluate();
         NX_VAR(Derived::logger(), "evaluationPassed", static_cast<unsigned>(passed));
         if (!passed) self().advance();
@@ -184,6 +194,7 @@ Derived& ModelPattern<Derived, Keys, NodeTypeV>::operator++() {
     NX_ENTER(Derived::logger());
     do {
         self().advance();
+        if (filterSet) skipRejected();
     } while (filterSet && instrumentation && !evaluate());
     NX_EXIT(Derived::logger());
     return self();

@@ -181,4 +181,33 @@ TEST_F(EndpointModel, SystemNameIsReadOncePerRequest) {
     EXPECT_EQ(WEXITSTATUS(status), 0) << "bit set per failed check";
 }
 
+// A lookup by name goes straight to the endpoints of that name: the walk (which traces each
+// evaluation) evaluates no endpoint of another readable name, yet still looks at one whose name
+// cannot be read, and finds every endpoint of the name in order.
+TEST_F(EndpointModel, LookupByNameEvaluatesOnlyEndpointsThatMayMatch) {
+    for (int i = 0; i < 40; ++i) host.endpoint(host.root(), "veth" + std::to_string(i), "veth");
+    host.remove(host.endpoint(host.root(), "nameless", "x"), ElementName);
+    host.endpoint(host.root(), "veth30", "again");
+    testhost::ScopedHostModel model(host);
+    testfiles::ScratchDir logs;
+    const std::string trace = logs.file("trace");
+    std::vector<std::string> names;
+    {
+        testfiles::ScopedEnv level("IPIF_LOG_LEVEL", "0"), log("IPIF_LOG_FILE", "/dev/null"),
+            traceEnv("IPIF_TRACE_FILE", trace);
+        TALog::TALogger::reconfigure();
+        IPprotocolEndpoint endpoints;
+        endpoints.setFilter(IPprotocolEndpoint::ByName, "veth30");
+        names = walk(endpoints);
+    }
+    TALog::TALogger::reconfigure();
+    EXPECT_EQ(names, (std::vector<std::string>{"veth30", "veth30"}));
+    const std::string traced = testfiles::readFile(trace);
+    size_t evaluations = 0;
+    for (size_t at = traced.find("ENTERING: evaluate()"); at != std::string::npos;
+         at = traced.find("ENTERING: evaluate()", at + 1))
+        ++evaluations;
+    EXPECT_EQ(evaluations, 3u);  // the two of that name and the nameless one
+}
+
 }  // namespace
