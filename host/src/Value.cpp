@@ -348,15 +348,18 @@ inline unsigned char folded(char c) {
 
 bool equalsIgnoreCase(std::string_view a, std::string_view b) {
     if (a.size() != b.size()) return false;
+    if (a == b) return true;  // names mostly come spelt as declared
     for (std::size_t i = 0; i < a.size(); ++i)
         if (folded(a[i]) != folded(b[i])) return false;
     return true;
 }
 
 std::size_t HashIgnoreCase::operator()(std::string_view name) const {
-    std::size_t hash = 14695981039346656037ull;  // FNV-1a
-    for (char c : name) hash = (hash ^ folded(c)) * 1099511628211ull;
-    return hash;
+    // FNV-1a over the bytes with bit 5 set: every upper-case letter hashes as its lower-case one
+    // (a few other characters do too, which costs a comparison, never a wrong answer).
+    std::uint64_t hash = 14695981039346656037ull;
+    for (char c : name) hash = (hash ^ (static_cast<unsigned char>(c) | 0x20u)) * 1099511628211ull;
+    return static_cast<std::size_t>(hash);
 }
 
 std::string quote(const std::string& text, bool mof) {
@@ -697,7 +700,13 @@ bool ObjectPath::operator==(const ObjectPath& other) const {
 
 std::string Instance::toMof() const {
     std::string out = "instance of " + path.className + " {\n";
-    for (const auto& p : properties) out += "    " + p.first + " = " + p.second.toText() + ";\n";
+    for (const auto& p : properties) {
+        out += "    ";
+        out += p.first;
+        out += " = ";
+        out += p.second.toText();
+        out += ";\n";
+    }
     out += "};\n";
     return out;
 }

@@ -158,6 +158,7 @@ public:
     void set(std::string_view name, Value value);
     bool erase(std::string_view name);
     void clear() { items_.clear(); }
+    void reserve(std::size_t count) { items_.reserve(count); }
 
     std::size_t size() const { return items_.size(); }
     bool empty() const { return items_.empty(); }
