@@ -355,33 +355,50 @@ bool equalsIgnoreCase(std::string_view a, std::string_view b) {
 }
 
 std::size_t HashIgnoreCase::operator()(std::string_view name) const {
-    // FNV-1a over the bytes with bit 5 set: every upper-case letter hashes as its lower-case one
-    // (a few other characters do too, which costs a comparison, never a wrong answer).
-    std::uint64_t hash = 14695981039346656037ull;
-    for (char c : name) hash = (hash ^ (static_cast<unsigned char>(c) | 0x20u)) * 1099511628211ull;
-    return static_cast<std::size_t>(hash);
+    // Eight bytes at a time, each with bit 5 set: every upper-case letter hashes as its lower-case
+    // one (a few other characters do too, which costs a comparison, never a wrong answer).
+    constexpr std::uint64_t kFold = 0x2020202020202020ull;
+    std::uint64_t hash = 14695981039346656037ull ^ name.size();
+    std::size_t at = 0;
+    for (; at + 8 <= name.size(); at += 8) {
+        std::uint64_t word;
+        std::memcpy(&word, name.data() + at, 8);
+        hash = (hash ^ (word | kFold)) * 1099511628211ull;
+        hash ^= hash >> 29;
+    }
+    const std::size_t rest = name.size() - at;
+    std::uint64_t tail = 0;
+    std::memcpy(&tail, name.data() + at, rest);
+    hash = (hash ^ (tail | (rest ? kFold >> (8 * (8 - rest)) : 0))) * 1099511628211ull;
+    return static_cast<std::size_t>(hash ^ (hash >> 32));
 }
 
 std::string quote(const std::string& text, bool mof) {
-    std::string out = "\"";
-    for (unsigned char c : text) {
+    std::string out;
+    out.reserve(text.size() + 2);
+    out += '"';
+    std::size_t plain = 0;  // where the run of characters copied as they are began
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        const auto c = static_cast<unsigned char>(text[i]);
+        if (c != '"' && c != '\\' && !(mof && c < 0x20)) continue;
+        out.append(text, plain, i - plain);
+        plain = i + 1;
         if (c == '"' || c == '\\') {
             out += '\\';
             out += static_cast<char>(c);
-        } else if (mof && c == '\n') {
+        } else if (c == '\n') {
             out += "\\n";
-        } else if (mof && c == '\t') {
+        } else if (c == '\t') {
             out += "\\t";
-        } else if (mof && c == '\r') {
+        } else if (c == '\r') {
             out += "\\r";
-        } else if (mof && c < 0x20) {
+        } else {
             char buf[8];
             std::snprintf(buf, sizeof buf, "\\x%02X", c);
             out += buf;
-        } else {
-            out += static_cast<char>(c);
         }
     }
+    out.append(text, plain, std::string::npos);
     out += '"';
     return out;
 }
