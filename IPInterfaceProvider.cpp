@@ -269,6 +269,7 @@ CMPIStatus IPInterface_MethodCleanup(CMPIMethodMI*, const CMPIContext*, CMPIBool
 
 CMPIStatus IPInterface_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                          const CMPIObjectPath* cop) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status =
         serveInstances(ctx, rslt, cop, false, [&](auto& adapter) { returnObjectPath(rslt, adapter.getObjectPath()); });
@@ -278,6 +279,7 @@ CMPIStatus IPInterface_EnumInstanceNames(CMPIInstanceMI*, const CMPIContext* ctx
 
 CMPIStatus IPInterface_EnumInstances(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                      const CMPIObjectPath* cop, const char** properties) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveInstances(
         ctx, rslt, cop, false, [&](auto& adapter) { returnInstance(rslt, adapter.getCMPIInstance(properties)); });
@@ -287,6 +289,7 @@ CMPIStatus IPInterface_EnumInstances(CMPIInstanceMI*, const CMPIContext* ctx, co
 
 CMPIStatus IPInterface_GetInstance(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                    const CMPIObjectPath* cop, const char** properties) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveInstances(
         ctx, rslt, cop, true, [&](auto& adapter) { returnInstance(rslt, adapter.getCMPIInstance(properties)); });
@@ -296,6 +299,7 @@ CMPIStatus IPInterface_GetInstance(CMPIInstanceMI*, const CMPIContext* ctx, cons
 
 CMPIStatus IPInterface_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const CMPIResult*, const CMPIObjectPath*,
                                       const CMPIInstance*) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_ERR_NOT_SUPPORTED, nullptr};
     EXIT_MARK();
@@ -304,6 +308,7 @@ CMPIStatus IPInterface_CreateInstance(CMPIInstanceMI*, const CMPIContext*, const
 
 CMPIStatus IPInterface_ModifyInstance(CMPIInstanceMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                       const CMPIObjectPath* cop, const CMPIInstance* ci, const char**) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     try {
@@ -338,6 +343,7 @@ CMPIStatus IPInterface_ExecQuery(CMPIInstanceMI*, const CMPIContext*, const CMPI
 CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                   const CMPIObjectPath* cop, const char* resultClass, const char*,
                                   const char** properties) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveReferences(ctx, rslt, cop, resultClass, [&](auto& adapter) {
         returnInstance(rslt, adapter.getCMPIInstance(properties));
@@ -348,6 +354,7 @@ CMPIStatus IPInterface_References(CMPIAssociationMI*, const CMPIContext* ctx, co
 
 CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                       const CMPIObjectPath* cop, const char* resultClass, const char*) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveReferences(ctx, rslt, cop, resultClass,
                                         [&](auto& adapter) { returnObjectPath(rslt, adapter.getObjectPath()); });
@@ -358,6 +365,7 @@ CMPIStatus IPInterface_ReferenceNames(CMPIAssociationMI*, const CMPIContext* ctx
 CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                    const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
                                    const char*, const char*, const char** properties) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveAssociators(ctx, rslt, cop, assocClass, resultClass, [&](auto& adapter) {
         returnInstance(rslt, adapter.getAssociator(properties));
@@ -369,6 +377,7 @@ CMPIStatus IPInterface_Associators(CMPIAssociationMI*, const CMPIContext* ctx, c
 CMPIStatus IPInterface_AssociatorNames(CMPIAssociationMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                        const CMPIObjectPath* cop, const char* assocClass, const char* resultClass,
                                        const char*, const char*) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = serveAssociators(ctx, rslt, cop, assocClass, resultClass, [&](auto& adapter) {
         returnObjectPath(rslt, adapter.getAssociatorNames());
@@ -380,6 +389,7 @@ CMPIStatus IPInterface_AssociatorNames(CMPIAssociationMI*, const CMPIContext* ct
 CMPIStatus IPInterface_InvokeMethod(CMPIMethodMI*, const CMPIContext* ctx, const CMPIResult* rslt,
                                     const CMPIObjectPath* cop, const char* method, const CMPIArgs* in,
                                     CMPIArgs* out) {
+    const RequestScope scope;
     ENTRY_MARK();
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     CMPIUint32 ret = 0;

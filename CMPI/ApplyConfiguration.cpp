@@ -69,6 +69,7 @@ void applyHostSettings(const IP_CONFIG_DATA* cfg_data) {
         cfg_data->dnsHostName != hostName) {
         NX_MESSAGE(loggerApplyConfiguration, 3000, "Applying the Hostname");
         system.setProperty(NodeLexicon::HostName, cfg_data->dnsHostName);
+        RequestScope::hostNameChanged();
     }
     std::string domainName;
     if (system.getProperty(NodeLexicon::DomainName, domainName) && !cfg_data->dnsDomainName.empty() &&

@@ -17,7 +17,7 @@ CMPIAssignmentSettingData::CMPIAssignmentSettingData(const CMPIBroker* broker, c
 }
 
 void CMPIAssignmentSettingData::setObjectPath(const CMPIObjectPath* path, bool isCfg) {
-    filterByKeys(__func__, parameterList(" objectPath=", path, " isCfg=", isCfg), path,
+    filterByKeys(__func__, TraceParams(" objectPath=", path, " isCfg=", isCfg), path,
                  {{"InstanceID", IPAssignmentSettingData::FilterType::ByInstanceID}}, isCfg);
 }
 
@@ -36,7 +36,7 @@ CMPIInstance* CMPIAssignmentSettingData::getCMPIInstance(const char** properties
 }
 
 CMPIStatus CMPIAssignmentSettingData::modifyInstance(const CMPIInstance* newInstance) {
-    const std::string params = parameterList(" newInstance=", newInstance);
+    const TraceParams params(" newInstance=", newInstance);
     NX_ENTER_PARAMS(loggerCMPIAssignmentSettingData, params.c_str());
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     const CMPIObjectPath* path = newInstance ? CMGetObjectPath(newInstance, nullptr) : nullptr;

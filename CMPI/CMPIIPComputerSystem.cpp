@@ -12,7 +12,7 @@ CMPIIPComputerSystem::CMPIIPComputerSystem(const CMPIBroker* broker_, const CMPI
       findServiceProcessor(false) {}
 
 void CMPIIPComputerSystem::setObjectPath(const CMPIObjectPath* path, bool findServiceProcessor_) {
-    const std::string params = parameterList(" objectPath=", path, " findServiceProcessor=", findServiceProcessor_);
+    const TraceParams params(" objectPath=", path, " findServiceProcessor=", findServiceProcessor_);
     NX_ENTER_PARAMS(loggerCMPIIPComputerSystem, params.c_str());
     findServiceProcessor = findServiceProcessor_;
     enumerate(path);
@@ -26,7 +26,7 @@ void CMPIIPComputerSystem::setObjectPath(const CMPIObjectPath* path, bool findSe
 // Every element is fetched, also after the match, so the enumeration is always drained; when
 // nothing matches the last element fetched stays current.
 void CMPIIPComputerSystem::findSP(CMPIEnumeration* systems, const CMPIObjectPath* path) {
-    const std::string params = parameterList(" enumeration=", systems, " objectPath=", path);
+    const TraceParams params(" enumeration=", systems, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIIPComputerSystem, params.c_str());
     std::string wanted;
     ProviderUtilities::getKeyProperty(path, "Name", wanted);

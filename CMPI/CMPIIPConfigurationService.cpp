@@ -29,7 +29,7 @@ CMPIIPConfigurationService::CMPIIPConfigurationService(const CMPIBroker* broker,
 }
 
 void CMPIIPConfigurationService::setObjectPath(const CMPIObjectPath* path) {
-    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+    filterByKeys(__func__, TraceParams(" objectPath=", path), path,
                  {{"SystemName", IPConfigurationService::FilterType::BySystemName}});
 }
 
@@ -169,7 +169,7 @@ CMPIUint32 CMPIIPConfigurationService::executeMethod(const CMPIArgs* in, CMPIArg
 
 CMPIInstance* CMPIIPConfigurationService::getConfiguartionSetting(const char* className,
                                                                   const std::string& instanceId) {
-    const std::string params = parameterList(" className=", className, " instanceId=", instanceId);
+    const TraceParams params(" className=", className, " instanceId=", instanceId);
     NX_ENTER_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
     const auto leave = [&](CMPIInstance* found) {
         NX_EXIT_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
@@ -206,7 +206,7 @@ CMPIInstance* CMPIIPConfigurationService::getConfiguartionSetting(const char* cl
 
 CMPIInstance* CMPIIPConfigurationService::getStaticConfiguration(CMPIObjectPath* classPath,
                                                                  const std::string& instanceId) {
-    const std::string params = parameterList(" classPath=", classPath, " instanceId=", instanceId);
+    const TraceParams params(" classPath=", classPath, " instanceId=", instanceId);
     NX_ENTER_PARAMS(loggerCMPIIPConfigurationService, params.c_str());
     CMPIInstance* found = nullptr;
     CMPIStaticIPAssignmentSettingData settings(broker, context, classPath);

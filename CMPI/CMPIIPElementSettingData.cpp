@@ -19,7 +19,7 @@ const AssociationClass kAssociation = {
 CMPIIPElementSettingData::CMPIIPElementSettingData(const CMPIBroker* broker_, const CMPIContext* context_,
                                                    const CMPIObjectPath* path)
     : Base(broker_, context_, path, kAssociation, loggerCMPIIPElementSettingData, NX_FILE) {
-    const std::string params = parameterList(" _broker=", broker_, " _context=", context_, " objectPath=", path);
+    const TraceParams params(" _broker=", broker_, " _context=", context_, " objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIIPElementSettingData, params.c_str());
     switch (requestedClassId) {
         case IPAssignmentSettingDataId:

@@ -20,7 +20,7 @@ CMPIIPEnabledLogicalElementCapabilities::CMPIIPEnabledLogicalElementCapabilities
 }
 
 void CMPIIPEnabledLogicalElementCapabilities::setObjectPath(const CMPIObjectPath* path) {
-    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+    filterByKeys(__func__, TraceParams(" objectPath=", path), path,
                  {{"InstanceID", IPEnabledLogicalElementCapabilities::FilterType::ByInstanceID}});
 }
 

@@ -9,7 +9,7 @@ CMPIIPLanEndPoint::CMPIIPLanEndPoint(const CMPIBroker* broker_, const CMPIContex
     : CMPILookupAdapter(broker_, context_, std::move(nameSpace_), loggerCMPIIPLanEndPoint, NX_FILE, __func__) {}
 
 void CMPIIPLanEndPoint::setSingleObjectPath(const CMPIObjectPath* path) {
-    const std::string params = parameterList(" objectPath=", path);
+    const TraceParams params(" objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIIPLanEndPoint, params.c_str());
     CMPIStatus rc = {CMPI_RC_OK, nullptr};
     CMPIInstance* found = broker ? CBGetInstance(broker, context, path, nullptr, &rc) : nullptr;
@@ -20,7 +20,7 @@ void CMPIIPLanEndPoint::setSingleObjectPath(const CMPIObjectPath* path) {
 }
 
 void CMPIIPLanEndPoint::setObjectPath(const CMPIObjectPath* path) {
-    const std::string params = parameterList(" objectPath=", path);
+    const TraceParams params(" objectPath=", path);
     NX_ENTER_PARAMS(loggerCMPIIPLanEndPoint, params.c_str());
     enumerate(path);
     takeFirst();

@@ -17,7 +17,7 @@ CMPIProtocolEndpoint::CMPIProtocolEndpoint(const CMPIBroker* broker, const CMPIC
 
 // The class keys are ours by construction; only system and interface name select.
 void CMPIProtocolEndpoint::setObjectPath(const CMPIObjectPath* path) {
-    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+    filterByKeys(__func__, TraceParams(" objectPath=", path), path,
                  {{"SystemName", IPprotocolEndpoint::FilterType::BySystemName},
                   {"Name", IPprotocolEndpoint::FilterType::ByName}});
 }
@@ -63,7 +63,7 @@ CMPIInstance* CMPIProtocolEndpoint::getCMPIInstance(const char** properties) {
 }
 
 CMPIStatus CMPIProtocolEndpoint::modifyInstance(const CMPIInstance* newInstance) {
-    const std::string params = parameterList(" newInstance=", newInstance);
+    const TraceParams params(" newInstance=", newInstance);
     NX_ENTER_PARAMS(loggerCMPIProtocolEndpoint, params.c_str());
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     const CMPIObjectPath* path = newInstance ? CMGetObjectPath(newInstance, nullptr) : nullptr;

@@ -16,7 +16,7 @@ CMPIRemoteServiceAccessPoint::CMPIRemoteServiceAccessPoint(const CMPIBroker* bro
 }
 
 void CMPIRemoteServiceAccessPoint::setObjectPath(const CMPIObjectPath* path) {
-    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+    filterByKeys(__func__, TraceParams(" objectPath=", path), path,
                  {{"SystemName", RemoteServiceAccessPoint::FilterType::BySystemName},
                   {"Name", RemoteServiceAccessPoint::FilterType::ByName}});
 }
@@ -46,7 +46,7 @@ CMPIInstance* CMPIRemoteServiceAccessPoint::getCMPIInstance(const char** propert
 }
 
 CMPIStatus CMPIRemoteServiceAccessPoint::modifyInstance(const CMPIInstance* newInstance) {
-    const std::string params = parameterList(" newInstance=", newInstance);
+    const TraceParams params(" newInstance=", newInstance);
     NX_ENTER_PARAMS(loggerCMPIRemoteServiceAccessPoint, params.c_str());
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     const CMPIObjectPath* path = newInstance ? CMGetObjectPath(newInstance, nullptr) : nullptr;

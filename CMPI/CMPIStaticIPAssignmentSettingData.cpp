@@ -19,7 +19,7 @@ CMPIStaticIPAssignmentSettingData::CMPIStaticIPAssignmentSettingData(const CMPIB
 }
 
 void CMPIStaticIPAssignmentSettingData::setObjectPath(const CMPIObjectPath* path) {
-    filterByKeys(__func__, parameterList(" objectPath=", path), path,
+    filterByKeys(__func__, TraceParams(" objectPath=", path), path,
                  {{"InstanceID", StaticIPAssignmentSettingData::FilterType::ByInstanceID}});
 }
 
@@ -49,7 +49,7 @@ CMPIInstance* CMPIStaticIPAssignmentSettingData::getCMPIInstance(const char** pr
 }
 
 CMPIStatus CMPIStaticIPAssignmentSettingData::modifyInstance(const CMPIInstance* newInstance) {
-    const std::string params = parameterList(" newInstance=", newInstance);
+    const TraceParams params(" newInstance=", newInstance);
     NX_ENTER_PARAMS(loggerCMPIStaticIPAssignmentSettingData, params.c_str());
     CMPIStatus status = {CMPI_RC_OK, nullptr};
     if (newInstance) {

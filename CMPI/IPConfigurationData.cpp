@@ -34,8 +34,7 @@ template <class Read>
 CMPIStatus readSetting(const char* function, const CMPIBroker* broker, const CMPIContext* context,
                        CMPIInstance* setting, IP_CONFIG_DATA* cfg_data, Read read) {
     const AdapterTrace tracer(loggerIPConfigurationData, NX_FILE);
-    const std::string params =
-        parameterList(" _broker=", broker, " _context=", context, " setting=", setting, " cfg_data=", cfg_data);
+    const TraceParams params(" _broker=", broker, " _context=", context, " setting=", setting, " cfg_data=", cfg_data);
     tracer(function, __LINE__, ENTERING, params);
     const bool valid = setting && cfg_data;
     if (valid) {
@@ -72,8 +71,8 @@ CMPIStatus getDHCPConfigurationDetails(const CMPIBroker* broker, const CMPIConte
 CMPIStatus getDNSConfigurationDetails(const CMPIBroker* broker, const CMPIContext* context,
                                       CMPIInstance* setting, CMPIObjectPath* endpoint,
                                       IP_CONFIG_DATA* cfg_data) {
-    const std::string params = parameterList(" _broker=", broker, " _context=", context, " setting=", setting,
-                                             " endpoint=", endpoint, " cfg_data=", cfg_data);
+    const TraceParams params(" _broker=", broker, " _context=", context, " setting=", setting, " endpoint=", endpoint,
+                             " cfg_data=", cfg_data);
     NX_ENTER_PARAMS(loggerIPConfigurationData, params.c_str());
     const auto leave = [&](CMPIStatus status) {
         NX_EXIT_PARAMS(loggerIPConfigurationData, params.c_str());

@@ -78,9 +78,7 @@ bool IPAssignmentSettingData::getConfigurationName(std::string& configurationNam
 }
 
 bool IPAssignmentSettingData::setConfigurationName(const std::string& configurationName) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " configurationName=" << configurationName;
-    const std::string list = parameters.str();
+    const TraceParams list(" configurationName=", configurationName);
     NX_ENTER_PARAMS(loggerIPAssignmentSettingData, list.c_str());
     std::string name, path;
     instrumentation.getProperty(Properties::ElementName, name);

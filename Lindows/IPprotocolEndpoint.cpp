@@ -23,6 +23,12 @@ bool IPprotocolEndpoint::filterHolds(const Filter& filter) {
     return true;
 }
 
+void IPprotocolEndpoint::skipRejected(const Filter& filter) {
+    // ByName compares the element name as getName reads it; the host model skips exactly the
+    // endpoints whose readable name differs.
+    if (filter.filterType == ByName) instrumentation.seek(Properties::ElementName, filter.reference);
+}
+
 bool IPprotocolEndpoint::onServiceProcessor() const {
     return instrumentation.getNodeDescription().find("BMC ") != std::string::npos;
 }
@@ -145,9 +151,7 @@ bool IPprotocolEndpoint::getAddressOrigin(unsigned short& addressOrigin) {
 }
 
 bool IPprotocolEndpoint::setAddressOrigin(unsigned short addressOrigin) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " addressOrigin=" << addressOrigin;
-    const std::string list = parameters.str();
+    const TraceParams list(" addressOrigin=", addressOrigin);
     NX_ENTER_PARAMS(loggerIPprotocolEndpoint, list.c_str());
     // Only static (3) and DHCP (4) have a node code; anything else is stored as unknown.
     unsigned int code = addressOrigin == 3 ? 3u : addressOrigin == 4 ? 1u : 0u;
@@ -157,9 +161,7 @@ bool IPprotocolEndpoint::setAddressOrigin(unsigned short addressOrigin) {
 }
 
 bool IPprotocolEndpoint::setIPv4Address(const std::string& address) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " address=" << address;
-    const std::string list = parameters.str();
+    const TraceParams list(" address=", address);
     NX_ENTER_PARAMS(loggerIPprotocolEndpoint, list.c_str());
     bool written = instrumentation.setProperty(Properties::IPv4Address, address);
     NX_EXIT_PARAMS(loggerIPprotocolEndpoint, list.c_str());
@@ -167,9 +169,7 @@ bool IPprotocolEndpoint::setIPv4Address(const std::string& address) {
 }
 
 bool IPprotocolEndpoint::setSubnetMask(const std::string& subnetMask) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " subnetMask=" << subnetMask;
-    const std::string list = parameters.str();
+    const TraceParams list(" subnetMask=", subnetMask);
     NX_ENTER_PARAMS(loggerIPprotocolEndpoint, list.c_str());
     bool written = instrumentation.setProperty(Properties::SubnetMask, subnetMask);
     NX_EXIT_PARAMS(loggerIPprotocolEndpoint, list.c_str());
@@ -177,9 +177,7 @@ bool IPprotocolEndpoint::setSubnetMask(const std::string& subnetMask) {
 }
 
 bool IPprotocolEndpoint::setEnabledState(unsigned short requestedState) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " requestedState=" << requestedState;
-    const std::string list = parameters.str();
+    const TraceParams list(" requestedState=", requestedState);
     NX_ENTER_PARAMS(loggerIPprotocolEndpoint, list.c_str());
 
     std::string name;

@@ -173,9 +173,7 @@ bool RemoteServiceAccessPoint::getOtherAccessContext(std::string& /*otherAccessC
 }
 
 bool RemoteServiceAccessPoint::setAccessInfo(const std::string& accessInfo) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " accessInfo=" << accessInfo;
-    const std::string list = parameters.str();
+    const TraceParams list(" accessInfo=", accessInfo);
     NX_ENTER_PARAMS(loggerRemoteServiceAccessPoint, list.c_str());
     bool accepted = true;
     unsigned int protocolIFType = 0;

@@ -30,11 +30,42 @@ void Tokenize(const std::string& text, std::vector<std::string>& tokens, const s
 void logRecord(const std::string& component, const char* function, const char* file, int line, int level,
                const char* text);
 
+// True when a record of level would be written: text for a dropped record is never formatted.
+inline bool tracing(int level) { return TALog::TALogger::isEnabled(level); }
+
+// The text of a trace parameter list: labels as given, pointers as their addresses.
+template <class... Parts>
+std::string parameterList(const Parts&... parts) {
+    TALog::TAMessageBuffer buffer;
+    (void)(buffer << ... << parts);
+    return buffer.str();
+}
+
+// A parameter list for the entry and exit lines of a function (level 3000), formatted only when
+// such lines are written; empty otherwise.
+class TraceParams {
+public:
+    template <class... Parts>
+    explicit TraceParams(const Parts&... parts) {
+        if (tracing(3000)) text_ = parameterList(parts...);
+    }
+    const char* c_str() const { return text_.c_str(); }
+
+private:
+    std::string text_;
+};
+
 }  // namespace Nx
 
 // Shorthands used throughout the provider. `logger` is the file's component text.
 #define NX_FILE __FILE_NAME__
-#define NX_TRACE_LOG(logger, level, text) ::Nx::logRecord((logger), __func__, NX_FILE, __LINE__, (level), (text))
+// The text (and the logger) are evaluated only when the record is written.
+#define NX_TRACE_LOG(logger, level, text)                                                \
+    do {                                                                                 \
+        const int nxLevel = (level);                                                     \
+        if (::Nx::tracing(nxLevel))                                                      \
+            ::Nx::logRecord((logger), __func__, NX_FILE, __LINE__, nxLevel, (text));     \
+    } while (0)
 // ENTERING/EXITING with a parameter list, level 3000.
 #define NX_ENTER_PARAMS(logger, params) \
     NX_TRACE_LOG(logger, 3000, ::Nx::tracepara(NX_FILE, __func__, __LINE__, (params), ::Nx::ENTERING))

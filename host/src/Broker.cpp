@@ -307,6 +307,8 @@ CMPIInstance* eNewInstance(const CMPIBroker* mb, const CMPIObjectPath* op, CMPIS
         Instance inst;
         inst.path = p->path;
         inst.path.className = c->name;
+        // Room for every declared property: a provider fills most of them.
+        inst.properties.reserve(h->repo.properties(c->name).size());
         for (const auto& k : p->path.keys) inst.properties.set(k.first, k.second);
         return make<InstanceObj>(h, std::move(inst));
     });

@@ -5,6 +5,7 @@
 #include <functional>
 #include <set>
 #include <sstream>
+#include <unordered_map>
 
 #include "TextFiles.h"
 
@@ -419,6 +420,11 @@ std::vector<ClassDecl> parseMof(const std::string& text, const std::string& file
 
 // ---- Repository ----------------------------------------------------------------------------
 
+// Maps by a name that ignore its case. The keys are views of names the repository keeps (a
+// declaration's, a resolved property's), which never move.
+template <class T>
+using ByName = std::unordered_map<std::string_view, T, HashIgnoreCase, EqualIgnoreCase>;
+
 struct ClassRepository::Data {
     struct Resolved {
         const ClassDecl* decl = nullptr;
@@ -426,14 +432,16 @@ struct ClassRepository::Data {
         std::vector<MethodDecl> methods;
         std::vector<std::string> chain;
         bool association = false;
+        // Where each of properties is, by name: a lookup per property set on an instance.
+        ByName<std::size_t> propertyAt;
     };
     std::vector<std::unique_ptr<ClassDecl>> classes;
-    std::map<std::string, const ClassDecl*> byName;  // lower-case name
-    std::map<std::string, Resolved> resolved;        // lower-case name
+    ByName<const ClassDecl*> byName;
+    ByName<Resolved> resolved;
     bool isResolved = false;
 
-    const Resolved* get(const std::string& cls) const {
-        auto it = resolved.find(lower(cls));
+    const Resolved* get(std::string_view cls) const {
+        auto it = resolved.find(cls);
         return it == resolved.end() ? nullptr : &it->second;
     }
 };
@@ -446,13 +454,12 @@ ClassRepository& ClassRepository::operator=(ClassRepository&&) noexcept = defaul
 void ClassRepository::addText(const std::string& text, const std::string& fileName) {
     std::vector<ClassDecl> parsed = parseMof(text, fileName);
     for (auto& c : parsed) {
-        std::string key = lower(c.name);
-        auto it = d_->byName.find(key);
+        auto it = d_->byName.find(c.name);
         if (it != d_->byName.end())
             throw MofError(c.file + ":" + std::to_string(c.line) + ": class " + c.name + " already declared at " +
                            it->second->file + ":" + std::to_string(it->second->line));
         d_->classes.push_back(std::make_unique<ClassDecl>(std::move(c)));
-        d_->byName[key] = d_->classes.back().get();
+        d_->byName.emplace(d_->classes.back()->name, d_->classes.back().get());
     }
     d_->isResolved = false;
 }
@@ -488,8 +495,8 @@ void ClassRepository::resolve() {
     d_->resolved.clear();
     std::set<std::string> inProgress;
     std::function<const Data::Resolved&(const ClassDecl&)> build = [&](const ClassDecl& c) -> const Data::Resolved& {
-        std::string key = lower(c.name);
-        auto done = d_->resolved.find(key);
+        const std::string key = lower(c.name);
+        auto done = d_->resolved.find(c.name);
         if (done != d_->resolved.end()) return done->second;
         if (!inProgress.insert(key).second) throw MofError(where(c) + "class " + c.name + " derives from itself");
         Data::Resolved r;
@@ -523,14 +530,16 @@ void ClassRepository::resolve() {
                 *it = m;
         }
         inProgress.erase(key);
-        return d_->resolved.emplace(key, std::move(r)).first->second;
+        Data::Resolved& made = d_->resolved.emplace(c.name, std::move(r)).first->second;
+        for (std::size_t i = 0; i < made.properties.size(); ++i) made.propertyAt.emplace(made.properties[i].name, i);
+        return made;
     };
     for (const auto& c : d_->classes) build(*c);
     d_->isResolved = true;
 }
 
-const ClassDecl* ClassRepository::find(const std::string& cls) const {
-    auto it = d_->byName.find(lower(cls));
+const ClassDecl* ClassRepository::find(std::string_view cls) const {
+    auto it = d_->byName.find(cls);
     return it == d_->byName.end() ? nullptr : it->second;
 }
 
@@ -560,10 +569,11 @@ const std::vector<PropertyDecl>& ClassRepository::properties(const std::string& 
     return r ? r->properties : none;
 }
 
-const PropertyDecl* ClassRepository::property(const std::string& cls, const std::string& name) const {
-    for (const auto& p : properties(cls))
-        if (equalsIgnoreCase(p.name, name)) return &p;
-    return nullptr;
+const PropertyDecl* ClassRepository::property(std::string_view cls, std::string_view name) const {
+    const Data::Resolved* r = d_->get(cls);
+    if (!r) return nullptr;
+    auto it = r->propertyAt.find(name);
+    return it == r->propertyAt.end() ? nullptr : &r->properties[it->second];
 }
 
 const std::vector<MethodDecl>& ClassRepository::methods(const std::string& cls) const {

@@ -665,7 +665,8 @@ CMPIStatus instSetProperty(const CMPIInstance* i, const char* name, const CMPIVa
         HostImpl* h = o->host;
         const std::string& cls = o->inst.path.className;
         const PropertyDecl* decl = h->repo.property(cls, name);
-        if (h->options.strictProperties && h->repo.exists(cls)) {
+        // A declared property implies a known class: the class is looked up again only when not.
+        if (h->options.strictProperties && (decl || h->repo.exists(cls))) {
             if (!decl) return status(h, CMPI_RC_ERR_NO_SUCH_PROPERTY, "class " + cls + " has no property " + name);
             if (decl->type != v.type() || decl->array != v.isArray())
                 return status(h, CMPI_RC_ERR_TYPE_MISMATCH,
@@ -673,7 +674,7 @@ CMPIStatus instSetProperty(const CMPIInstance* i, const char* name, const CMPIVa
                                   (decl->array ? "[]" : ""));
         }
         if (!inFilter(o, name) && !(decl && decl->key)) return okStatus();
-        std::string n = decl ? decl->name : std::string(name);
+        const std::string_view n = decl ? std::string_view(decl->name) : std::string_view(name);
         if (decl && decl->key) o->inst.path.keys.set(n, v);
         o->inst.properties.set(n, std::move(v));
         return okStatus();

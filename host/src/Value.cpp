@@ -336,34 +336,69 @@ std::string rcName(int rc) {
     return "CMPI_RC_" + std::to_string(rc);
 }
 
-bool equalsIgnoreCase(const std::string& a, const std::string& b) {
+namespace {
+
+// ASCII only: CIM names are ASCII, and the result must not depend on the locale.
+inline unsigned char folded(char c) {
+    const auto u = static_cast<unsigned char>(c);
+    return u >= 'A' && u <= 'Z' ? static_cast<unsigned char>(u + ('a' - 'A')) : u;
+}
+
+}  // namespace
+
+bool equalsIgnoreCase(std::string_view a, std::string_view b) {
     if (a.size() != b.size()) return false;
+    if (a == b) return true;  // names mostly come spelt as declared
     for (std::size_t i = 0; i < a.size(); ++i)
-        if (std::tolower(static_cast<unsigned char>(a[i])) != std::tolower(static_cast<unsigned char>(b[i])))
-            return false;
+        if (folded(a[i]) != folded(b[i])) return false;
     return true;
 }
 
+std::size_t HashIgnoreCase::operator()(std::string_view name) const {
+    // Eight bytes at a time, each with bit 5 set: every upper-case letter hashes as its lower-case
+    // one (a few other characters do too, which costs a comparison, never a wrong answer).
+    constexpr std::uint64_t kFold = 0x2020202020202020ull;
+    std::uint64_t hash = 14695981039346656037ull ^ name.size();
+    std::size_t at = 0;
+    for (; at + 8 <= name.size(); at += 8) {
+        std::uint64_t word;
+        std::memcpy(&word, name.data() + at, 8);
+        hash = (hash ^ (word | kFold)) * 1099511628211ull;
+        hash ^= hash >> 29;
+    }
+    const std::size_t rest = name.size() - at;
+    std::uint64_t tail = 0;
+    std::memcpy(&tail, name.data() + at, rest);
+    hash = (hash ^ (tail | (rest ? kFold >> (8 * (8 - rest)) : 0))) * 1099511628211ull;
+    return static_cast<std::size_t>(hash ^ (hash >> 32));
+}
+
 std::string quote(const std::string& text, bool mof) {
-    std::string out = "\"";
-    for (unsigned char c : text) {
+    std::string out;
+    out.reserve(text.size() + 2);
+    out += '"';
+    std::size_t plain = 0;  // where the run of characters copied as they are began
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        const auto c = static_cast<unsigned char>(text[i]);
+        if (c != '"' && c != '\\' && !(mof && c < 0x20)) continue;
+        out.append(text, plain, i - plain);
+        plain = i + 1;
         if (c == '"' || c == '\\') {
             out += '\\';
             out += static_cast<char>(c);
-        } else if (mof && c == '\n') {
+        } else if (c == '\n') {
             out += "\\n";
-        } else if (mof && c == '\t') {
+        } else if (c == '\t') {
             out += "\\t";
-        } else if (mof && c == '\r') {
+        } else if (c == '\r') {
             out += "\\r";
-        } else if (mof && c < 0x20) {
+        } else {
             char buf[8];
             std::snprintf(buf, sizeof buf, "\\x%02X", c);
             out += buf;
-        } else {
-            out += static_cast<char>(c);
         }
     }
+    out.append(text, plain, std::string::npos);
     out += '"';
     return out;
 }
@@ -509,19 +544,19 @@ bool Value::operator==(const Value& other) const {
 
 // ---- NamedValues ---------------------------------------------------------------------------
 
-const Value* NamedValues::find(const std::string& name) const {
+const Value* NamedValues::find(std::string_view name) const {
     for (const auto& item : items_)
         if (equalsIgnoreCase(item.first, name)) return &item.second;
     return nullptr;
 }
 
-Value* NamedValues::find(const std::string& name) {
+Value* NamedValues::find(std::string_view name) {
     for (auto& item : items_)
         if (equalsIgnoreCase(item.first, name)) return &item.second;
     return nullptr;
 }
 
-void NamedValues::set(const std::string& name, Value value) {
+void NamedValues::set(std::string_view name, Value value) {
     if (Value* v = find(name)) {
         *v = std::move(value);
         return;
@@ -529,7 +564,7 @@ void NamedValues::set(const std::string& name, Value value) {
     items_.emplace_back(name, std::move(value));
 }
 
-bool NamedValues::erase(const std::string& name) {
+bool NamedValues::erase(std::string_view name) {
     for (auto it = items_.begin(); it != items_.end(); ++it)
         if (equalsIgnoreCase(it->first, name)) {
             items_.erase(it);
@@ -682,7 +717,13 @@ bool ObjectPath::operator==(const ObjectPath& other) const {
 
 std::string Instance::toMof() const {
     std::string out = "instance of " + path.className + " {\n";
-    for (const auto& p : properties) out += "    " + p.first + " = " + p.second.toText() + ";\n";
+    for (const auto& p : properties) {
+        out += "    ";
+        out += p.first;
+        out += " = ";
+        out += p.second.toText();
+        out += ";\n";
+    }
     out += "};\n";
     return out;
 }

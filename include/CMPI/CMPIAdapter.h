@@ -21,14 +21,6 @@
 namespace Nx {
 namespace IPInterfaceProvider {
 
-// The text of a trace parameter list: labels as given, pointers as their addresses.
-template <class... Parts>
-std::string parameterList(const Parts&... parts) {
-    TALog::TAMessageBuffer buffer;
-    (void)(buffer << ... << parts);
-    return buffer.str();
-}
-
 // A broker status as the failure lines trace it: "Error Status: rc", then the message if any.
 inline std::string errorStatusText(const CMPIStatus& status) {
     std::string text = "Error Status: " + std::to_string(status.rc);
@@ -45,24 +37,26 @@ public:
     AdapterTrace(const std::string& logger, const char* file) : logger_(logger), file_(file) {}
 
     // ENTERING, EXITING...: level 4000 plain, 3000 with a parameter list.
-    void operator()(const char* function, int line, MessageType type, const std::string& params = {}) const {
-        logRecord(logger_, function, file_, line, params.empty() ? 4000 : 3000,
-                  params.empty() ? trace(file_, function, line, type)
-                                 : tracepara(file_, function, line, params.c_str(), type));
+    void operator()(const char* function, int line, MessageType type) const {
+        if (tracing(4000)) logRecord(logger_, function, file_, line, 4000, trace(file_, function, line, type));
+    }
+    void operator()(const char* function, int line, MessageType type, const TraceParams& params) const {
+        if (tracing(3000))
+            logRecord(logger_, function, file_, line, 3000, tracepara(file_, function, line, params.c_str(), type));
     }
     template <class Value>
     void variable(const char* function, int line, const char* name, Value value) const {
-        logRecord(logger_, function, file_, line, 4000, trace(name, file_, line, value));
+        if (tracing(4000)) logRecord(logger_, function, file_, line, 4000, trace(name, file_, line, value));
     }
     void message(const char* function, int line, int level, const char* text) const {
-        logRecord(logger_, function, file_, line, level, trace(file_, text, line, FREE_MESSAGE));
+        if (tracing(level)) logRecord(logger_, function, file_, line, level, trace(file_, text, line, FREE_MESSAGE));
     }
     // The trace of an adapter's constructor function taking (broker, context, last): ENTERING,
     // then body, then EXITING; lastLabel names the last parameter.
     template <class Last, class Body>
     void construction(const char* function, const CMPIBroker* broker, const CMPIContext* context,
                       const char* lastLabel, const Last& last, Body body) const {
-        const std::string params = parameterList(" _broker=", broker, " _context=", context, lastLabel, last);
+        const TraceParams params(" _broker=", broker, " _context=", context, lastLabel, last);
         (*this)(function, __LINE__, ENTERING, params);
         body();
         (*this)(function, __LINE__, EXITING, params);
@@ -143,7 +137,7 @@ protected:
     // keys that the path holds (a class path holds none) is traced and made the model's filter,
     // setFilter taking extra after the value.
     template <class M = Model, class... Extra>
-    void filterByKeys(const char* function, const std::string& params, const CMPIObjectPath* path,
+    void filterByKeys(const char* function, const TraceParams& params, const CMPIObjectPath* path,
                       std::initializer_list<std::pair<const char*, typename M::FilterType>> keys, Extra... extra) {
         tracer(function, __LINE__, ENTERING, params);
         if (ProviderUtilities::getKeyCount(path) != 0) {
@@ -184,7 +178,7 @@ protected:
     template <class Self, class Fill>
     CMPIInstance* instanceOf(const char* function, const char** properties, const char** applied, Self* self,
                              Fill fill) {
-        const std::string params = parameterList(" properties=", properties);
+        const TraceParams params(" properties=", properties);
         tracer(function, __LINE__, ENTERING, params);
         CMPIInstance* instance = ProviderUtilities::createInstance(broker, self->getObjectPath(), applied);
         if (instance) fill(instance);
@@ -290,7 +284,7 @@ public:
 
     // The current instance as fetched; properties is not applied.
     CMPIInstance* getCMPIInstance(const char** properties) {
-        const std::string params = parameterList(" properties=", properties);
+        const TraceParams params(" properties=", properties);
         tracer(__func__, __LINE__, ENTERING, params);
         tracer(__func__, __LINE__, EXITING, params);
         return instance;

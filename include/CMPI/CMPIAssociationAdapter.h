@@ -102,7 +102,7 @@ public:
     // True when resultClass can never be the class of the far end. Only the far end's own class
     // and its direct CIM parent are accepted, in any case. resultClass must not be null.
     bool isNotTargetClass(const char* resultClass) const {
-        const std::string params = parameterList(" resultClass=", resultClass);
+        const TraceParams params(" resultClass=", resultClass);
         tracer(__func__, __LINE__, ENTERING, params);
         bool notTarget = true;
         if (const AssociationEnd* far = farEnd())
@@ -123,7 +123,7 @@ public:
     }
 
     CMPIInstance* getAssociator(const char** properties) {
-        const std::string params = parameterList(" properties=", properties);
+        const TraceParams params(" properties=", properties);
         tracer(__func__, __LINE__, ENTERING, params);
         CMPIInstance* instance = nullptr;
         if (requestedClassId == association.a.classId) instance = endB.getCMPIInstance(properties);
@@ -149,7 +149,7 @@ public:
 
     // The association instance: its references and its own properties.
     CMPIInstance* getCMPIInstance(const char** properties) {
-        const std::string params = parameterList(" properties=", properties);
+        const TraceParams params(" properties=", properties);
         tracer(__func__, __LINE__, ENTERING, params);
         CMPIObjectPath* path = getObjectPath();
         CMPIInstance* instance = ProviderUtilities::createInstance(broker, path);
@@ -219,13 +219,14 @@ protected:
     template <class Convert>
     CMPIObjectPath* locate(const CMPIObjectPath* source, const char* farClass, Convert convert,
                            const char* conversion) {
-        const std::string params = parameterList(" objectPath=", source, " farClass=", farClass);
+        const TraceParams params(" objectPath=", source, " farClass=", farClass);
         tracer(__func__, __LINE__, ENTERING, params);
         CMPIObjectPath* far = ProviderUtilities::createObjectPath(broker, farClass, nameSpace);
         if (ProviderUtilities::getKeyCount(source) != 0) {
             Nx::Moniker moniker = ProviderUtilities::transformObjectPathToMoniker(source);
             Nx::Moniker located = std::invoke(convert, model, moniker);
-            tracer.message(__func__, __LINE__, 3000, (std::string("Returned from ") + conversion).c_str());
+            if (tracing(3000))
+                tracer.message(__func__, __LINE__, 3000, (std::string("Returned from ") + conversion).c_str());
             if (far) ProviderUtilities::transformMonikerToObjectPath(located, far);
         }
         tracer(__func__, __LINE__, EXITING, params);
@@ -273,7 +274,7 @@ protected:
         auto& member = end<MemberSide>();
         const AssociationEnd& anchorEnd = AnchorSide == Side::A ? association.a : association.b;
         const AssociationEnd& memberEnd = AnchorSide == Side::A ? association.b : association.a;
-        const std::string params = parameterList(" objectPath=", path);
+        const TraceParams params(" objectPath=", path);
         tracer(__func__, __LINE__, ENTERING, params);
         walked = MemberSide;
         bool positioned = false;

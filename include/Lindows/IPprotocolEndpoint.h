@@ -48,6 +48,7 @@ public:
 private:
     static const std::string& logger();
     bool filterHolds(const Filter& filter);
+    void skipRejected(const Filter& filter);  // a name goes straight to the endpoints of that name
     bool onServiceProcessor() const;
     bool stateFromNode(unsigned short& state);
 };

@@ -9,6 +9,9 @@
 //   bool filterHolds(const Filter& filter);   one filter against the current object
 // and may replace:
 //   void advance();                           step to the next object (default: next node)
+//   void skipRejected(const Filter& filter);  move forward past objects the filter certainly
+//                                             rejects, never past one it may accept (default:
+//                                             stay; the walk then evaluates every object)
 // Keys supplies the class's FilterType enumeration (with a fixed underlying type, so that a
 // filter type outside the enumeration can be stored; such a filter always holds).
 #pragma once
@@ -19,7 +22,6 @@
 
 #include "Nx/Instrumentation.h"
 #include "Nx/NodeLexicon.h"
-#include "TALog/TAMessageBuffer.h"
 #include "Trace.h"
 
 namespace Nx {
@@ -33,8 +35,31 @@ struct Site {
 };
 #define NX_SITE (::Nx::IPInterfaceProvider::Site{__func__, NX_FILE, __LINE__})
 
-// The host name from gethostname. False when gethostname fails.
+// The host name from gethostname; false (name untouched) when gethostname fails. Within a
+// RequestScope the system is asked once and every later call gets the same answer.
 bool localHostName(std::string& name);
+
+// One provider request on this thread, from the entry point until it returns. The host name may
+// change between requests, never within one. Scopes nest (an up-call that comes back into the
+// provider belongs to the outer request).
+class RequestScope {
+public:
+    RequestScope();
+    ~RequestScope();
+    RequestScope(const RequestScope&) = delete;
+    RequestScope& operator=(const RequestScope&) = delete;
+
+    // The request itself has changed the host name: the next localHostName asks the system.
+    static void hostNameChanged();
+
+private:
+    friend bool localHostName(std::string& name);
+
+    RequestScope* const outer_;  // null for the outermost scope, which holds what was learnt
+    bool asked_ = false;
+    bool known_ = false;  // gethostname succeeded
+    std::string hostName_;
+};
 
 template <class Derived, class Keys, Nx::NodeLexicon::NodeType NodeTypeV = Nx::NodeLexicon::IPEndpointNode>
 class ModelPattern : public Keys {
@@ -67,16 +92,18 @@ protected:
     ~ModelPattern() = default;
 
     void advance() { ++instrumentation; }
+    void skipRejected(const Filter&) {}
 
     // A getter's work, traced as the getter at: its ENTERING and EXITING lines (level 4000)
     // around body, whose answer it returns.
     template <class Body>
     static bool traced(const Site& at, Body body) {
-        record(at, 4000, trace(at.file, at.function, at.line, ENTERING));
+        if (tracing(4000)) record(at, 4000, trace(at.file, at.function, at.line, ENTERING));
         const bool answered = body();
-        record(at, 4000, trace(at.file, at.function, at.line, EXITING));
+        if (tracing(4000)) record(at, 4000, trace(at.file, at.function, at.line, EXITING));
         return answered;
     }
+    // Callers check tracing(level) before they format text.
     static void record(const Site& at, int level, const char* text) {
         logRecord(Derived::logger(), at.function, at.file, at.line, level, text);
     }
@@ -112,7 +139,7 @@ protected:
                 return true;
             }
             if (localHostName(name)) return true;
-            record(at, 6000, trace(at.file, "gethostname Failed", at.line, FREE_MESSAGE));
+            if (tracing(6000)) record(at, 6000, trace(at.file, "gethostname Failed", at.line, FREE_MESSAGE));
             return false;
         });
     }
@@ -123,19 +150,23 @@ protected:
 
 private:
     Derived& self() { return static_cast<Derived&>(*this); }
+    // Lets each filter move the walk past what it rejects.
+    void skipRejected() {
+        for (const Filter& filter : filters) self().skipRejected(filter);
+    }
 };
 
 template <class Derived, class Keys, Nx::NodeLexicon::NodeType NodeTypeV>
 void ModelPattern<Derived, Keys, NodeTypeV>::setFilter(FilterType filterType, const std::string& reference) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " filterType=" << static_cast<int>(filterType) << " reference=" << reference;
-    const std::string list = parameters.str();
+    const TraceParams list(" filterType=", static_cast<int>(filterType), " reference=", reference);
     NX_ENTER_PARAMS(Derived::logger(), list.c_str());
 
     filterSet = true;
     filters.push_back(Filter{filterType, reference});
     bool passed = false;
     while (instrumentation && !passed) {
+        skipRejected();
+        if (!instrumentation) break;
         passed = evaluate();
         NX_VAR(Derived::logger(), "evaluationPassed", static_cast<unsigned>(passed));
         if (!passed) self().advance();
@@ -163,6 +194,7 @@ Derived& ModelPattern<Derived, Keys, NodeTypeV>::operator++() {
     NX_ENTER(Derived::logger());
     do {
         self().advance();
+        if (filterSet) skipRejected();
     } while (filterSet && instrumentation && !evaluate());
     NX_EXIT(Derived::logger());
     return self();

@@ -43,6 +43,18 @@ Instrumentation& Instrumentation::operator++() {
     return *this;
 }
 
+bool Instrumentation::seek(NodeLexicon::Properties property, const std::string& text) {
+    if (!node()) return false;
+    index_ = tree_->nextComparable(index_, property, text);
+    return index_ >= 0;
+}
+
+bool Instrumentation::selectParent() {
+    const HostModel::Node* current = node();
+    index_ = current ? current->parent : -1;
+    return index_ >= 0;
+}
+
 Instrumentation::operator bool() const { return node() != nullptr; }
 
 const HostModel::Node* Instrumentation::node() const {

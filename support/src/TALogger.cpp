@@ -191,6 +191,8 @@ void TALogger::traceLevelMessage(const char* function, const char* file, int lin
     config->traceFile->writeLine(record);
 }
 
+bool TALogger::isEnabled(int level) { return !dropped(level); }
+
 void TALogger::reconfigure() {
     loadOnce();
     install(readEnvironment());

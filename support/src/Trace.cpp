@@ -92,11 +92,13 @@ void logRecord(const std::string& component, const char* function, const char* f
 }
 
 void markProviderEntry(const std::string& component, const char* file, const char* function, int line) {
+    if (!tracing(4000)) return;
     logRecord(component, "markProviderEntry", NX_FILE, __LINE__, 4000, kSeparator);
     logRecord(component, "markProviderEntry", NX_FILE, __LINE__, 4000, trace(file, function, line, ENTERING));
 }
 
 void markProviderExit(const std::string& component, const char* file, const char* function, int line) {
+    if (!tracing(4000)) return;
     logRecord(component, "markProviderExit", NX_FILE, __LINE__, 4000, trace(file, function, line, EXITING));
     logRecord(component, "markProviderExit", NX_FILE, __LINE__, 4000, kSeparator);
 }

@@ -162,4 +162,28 @@ TEST_F(EndpointAdapter, RequestStateChangeRefusalsCarryTheirCodesAndTexts) {
     EXPECT_EQ(statusText(status), "1:Invalid Type of TimeOut Parameter");
 }
 
+// Below the threshold (6000 here) no trace text is made: the helpers' buffers keep what they held.
+// With everything traced, the same walk writes its entry lines with their parameter lists.
+TEST_F(EndpointAdapter, FormatsNoTraceTextBelowTheThreshold) {
+    useFixture("host-basic.model");
+    const char* buffers[] = {Nx::trace("v", "S", 1, "s"), Nx::trace("n", "S", 1, 1u),
+                             Nx::trace("S", "f", 1, Nx::ENTERING), Nx::tracepara("S", "f", 1, "s", Nx::ENTERING)};
+    const std::vector<std::string> before(std::begin(buffers), std::end(buffers));
+    const auto walkAll = [&] {
+        CMPIProtocolEndpoint adapter(broker, nullptr, path(kClass));
+        for (CMPIInstance* i : walk(adapter)) EXPECT_NE(i, nullptr);
+        CMPIProtocolEndpoint keyed(broker, nullptr, path(kClass, {{"Name", "eth1"}}));
+        EXPECT_NE(keyed.getObjectPath(), nullptr);
+    };
+    walkAll();
+    for (size_t i = 0; i < before.size(); ++i) EXPECT_EQ(buffers[i], before[i]) << i;
+    EXPECT_EQ(testfiles::readFile(scratch.file("trace")), "");
+
+    testfiles::ScopedEnv everything("IPIF_LOG_LEVEL", "0");
+    TALog::TALogger::reconfigure();
+    walkAll();
+    EXPECT_EQ(logged("ENTERING: getCMPIInstance() in CMPIProtocolEndpoint.cpp"), 5u);
+    EXPECT_EQ(logged("Parameters List:  filterType=1 reference=eth1"), 2u);  // entry and exit
+}
+
 }  // namespace

@@ -1,5 +1,10 @@
 // The IP protocol endpoint model and the filter/walk pattern it shares with the other models.
+#include <sched.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
 #include <array>
+#include <cstring>
 #include <string>
 #include <utility>
 #include <vector>
@@ -138,6 +143,71 @@ TEST_F(EndpointModel, AddressOriginTableAndRoundTrips) {
         endpoint.getAddressOrigin(origin);
         EXPECT_EQ(origin, readBack) << written;
     }
+}
+
+// The host name is read once per request (in a UTS namespace of a child's own): a rename during
+// the request shows from the next request on, or at once when the request made it itself.
+TEST_F(EndpointModel, SystemNameIsReadOncePerRequest) {
+    using Nx::IPInterfaceProvider::RequestScope;
+    testhost::ScopedHostModel model(host);
+    const pid_t child = ::fork();
+    ASSERT_GE(child, 0);
+    if (child == 0) {
+        if (::unshare(CLONE_NEWUTS) != 0) ::_exit(99);
+        const auto rename = [](const char* name) { return ::sethostname(name, std::strlen(name)) == 0; };
+        const auto systemName = [] {
+            std::string name;
+            IPprotocolEndpoint().getSystemName(name);
+            return name;
+        };
+        int wrong = !rename("first");
+        {
+            const RequestScope request;
+            wrong |= (systemName() != "first") << 1;
+            wrong |= !rename("second") << 2;
+            const RequestScope upcall;
+            wrong |= (systemName() != "first") << 3;
+            RequestScope::hostNameChanged();
+            wrong |= (systemName() != "second") << 4;
+            wrong |= !rename("third") << 5;
+        }
+        wrong |= (systemName() != "third") << 6;
+        ::_exit(wrong);
+    }
+    int status = 0;
+    ASSERT_EQ(::waitpid(child, &status, 0), child);
+    ASSERT_TRUE(WIFEXITED(status));
+    if (WEXITSTATUS(status) == 99) GTEST_SKIP() << "no UTS namespace here";
+    EXPECT_EQ(WEXITSTATUS(status), 0) << "bit set per failed check";
+}
+
+// A lookup by name goes straight to the endpoints of that name: the walk (which traces each
+// evaluation) evaluates no endpoint of another readable name, yet still looks at one whose name
+// cannot be read, and finds every endpoint of the name in order.
+TEST_F(EndpointModel, LookupByNameEvaluatesOnlyEndpointsThatMayMatch) {
+    for (int i = 0; i < 40; ++i) host.endpoint(host.root(), "veth" + std::to_string(i), "veth");
+    host.remove(host.endpoint(host.root(), "nameless", "x"), ElementName);
+    host.endpoint(host.root(), "veth30", "again");
+    testhost::ScopedHostModel model(host);
+    testfiles::ScratchDir logs;
+    const std::string trace = logs.file("trace");
+    std::vector<std::string> names;
+    {
+        testfiles::ScopedEnv level("IPIF_LOG_LEVEL", "0"), log("IPIF_LOG_FILE", "/dev/null"),
+            traceEnv("IPIF_TRACE_FILE", trace);
+        TALog::TALogger::reconfigure();
+        IPprotocolEndpoint endpoints;
+        endpoints.setFilter(IPprotocolEndpoint::ByName, "veth30");
+        names = walk(endpoints);
+    }
+    TALog::TALogger::reconfigure();
+    EXPECT_EQ(names, (std::vector<std::string>{"veth30", "veth30"}));
+    const std::string traced = testfiles::readFile(trace);
+    size_t evaluations = 0;
+    for (size_t at = traced.find("ENTERING: evaluate()"); at != std::string::npos;
+         at = traced.find("ENTERING: evaluate()", at + 1))
+        ++evaluations;
+    EXPECT_EQ(evaluations, 3u);  // the two of that name and the nameless one
 }
 
 }  // namespace

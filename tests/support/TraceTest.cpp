@@ -230,6 +230,36 @@ TEST(Logging, SyslogKeepsTheHostProcessIdentity) {
     EXPECT_NE(received[1].find("cimserver: IPInterfaceProvider: provider record"), std::string::npos) << received[1];
 }
 
+// The shorthands format (and evaluate) a record's text only when the record is written: a dropped
+// record leaves every trace buffer as it was.
+TEST(Logging, DroppedRecordsAreNeverFormatted) {
+    const auto traceAll = [](int& evaluated) {
+        NX_VAR(kComponent, "name", (++evaluated, "value"));
+        NX_VAR(kComponent, "number", 7u);
+        NX_ENTER(kComponent);
+        NX_ENTER_PARAMS(kComponent, (++evaluated, "p=1"));
+        NX_MESSAGE(kComponent, 3000, "note");
+        Nx::markProviderEntry(kComponent, "F.cpp", "request", 1);
+    };
+    const char* buffers[] = {Nx::trace("v", "S", 1, "s"), Nx::trace("n", "S", 1, 1u),
+                             Nx::trace("S", "f", 1, Nx::ENTERING), Nx::tracepara("S", "f", 1, "s", Nx::ENTERING)};
+    std::vector<std::string> before(std::begin(buffers), std::end(buffers));
+    int evaluated = 0;
+    {
+        LogFiles files("4001");
+        traceAll(evaluated);
+        EXPECT_EQ(evaluated, 0);
+        for (size_t i = 0; i < before.size(); ++i) EXPECT_EQ(buffers[i], before[i]) << i;
+        EXPECT_EQ(files.trace(), "");
+    }
+    LogFiles files("3000");
+    traceAll(evaluated);
+    EXPECT_EQ(evaluated, 2);
+    for (size_t i = 0; i < before.size(); ++i) EXPECT_NE(buffers[i], before[i]) << i;
+    EXPECT_EQ(lines(files.trace()).size(), 7u);
+    EXPECT_NE(files.trace().find("ENTERING: operator()() in TraceTest.cpp"), std::string::npos);
+}
+
 TEST(Logging, AppendsFromThreadsAndProcessesNeverInterleave) {
     LogFiles files("3000");
     const std::string line(300, 'x');

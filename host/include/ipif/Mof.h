@@ -97,8 +97,8 @@ public:
     // line of the offending declaration. Queries are valid after it.
     void resolve();
 
-    const ClassDecl* find(const std::string& className) const;
-    bool exists(const std::string& className) const { return find(className) != nullptr; }
+    const ClassDecl* find(std::string_view className) const;
+    bool exists(std::string_view className) const { return find(className) != nullptr; }
     // True when cls is parent or derives from it; false when either is unknown.
     bool isA(const std::string& cls, const std::string& parent) const;
     std::vector<std::string> classNames() const;  // declared spelling, sorted
@@ -108,7 +108,7 @@ public:
     // Effective features, inherited ones included: root-most declaration first, a
     // redeclaration merged into the inherited slot. Empty / null when the class is unknown.
     const std::vector<PropertyDecl>& properties(const std::string& cls) const;
-    const PropertyDecl* property(const std::string& cls, const std::string& name) const;
+    const PropertyDecl* property(std::string_view cls, std::string_view name) const;
     const std::vector<MethodDecl>& methods(const std::string& cls) const;
     const MethodDecl* method(const std::string& cls, const std::string& name) const;
     std::vector<std::string> keyNames(const std::string& cls) const;

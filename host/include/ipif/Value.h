@@ -16,6 +16,7 @@
 #include <memory>
 #include <stdexcept>
 #include <string>
+#include <string_view>
 #include <utility>
 #include <variant>
 #include <vector>
@@ -60,7 +61,14 @@ private:
 std::string rcName(int rc);
 
 // Case-insensitive ASCII comparison, as CIM compares names.
-bool equalsIgnoreCase(const std::string& a, const std::string& b);
+bool equalsIgnoreCase(std::string_view a, std::string_view b);
+// Hash and equality of names that ignore ASCII case, for maps keyed by name.
+struct HashIgnoreCase {
+    std::size_t operator()(std::string_view name) const;
+};
+struct EqualIgnoreCase {
+    bool operator()(std::string_view a, std::string_view b) const { return equalsIgnoreCase(a, b); }
+};
 
 struct ObjectPath;
 struct Instance;
@@ -144,12 +152,13 @@ class NamedValues {
 public:
     using Item = std::pair<std::string, Value>;
 
-    const Value* find(const std::string& name) const;
-    Value* find(const std::string& name);
+    const Value* find(std::string_view name) const;
+    Value* find(std::string_view name);
     // Replaces the value of an existing name (keeping its position) or appends.
-    void set(const std::string& name, Value value);
-    bool erase(const std::string& name);
+    void set(std::string_view name, Value value);
+    bool erase(std::string_view name);
     void clear() { items_.clear(); }
+    void reserve(std::size_t count) { items_.reserve(count); }
 
     std::size_t size() const { return items_.size(); }
     bool empty() const { return items_.empty(); }
@@ -186,7 +195,7 @@ struct Instance {
     NamedValues properties;
 
     const std::string& className() const { return path.className; }
-    const Value* property(const std::string& name) const { return properties.find(name); }
+    const Value* property(std::string_view name) const { return properties.find(name); }
 
     // instance of Class {
     //     Prop = value;

@@ -4,7 +4,9 @@
 
 #include <map>
 #include <memory>
+#include <mutex>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace Nx {
@@ -42,6 +44,30 @@ struct Tree {
     int find(const std::string& path) const;  // index of the node at path, -1 when none
     // Appends a node under parent (-1 for the root) and fills its path; returns its index.
     int add(int parent, unsigned int type, const std::string& name, const std::string& description);
+
+    // The first node from index `from` on (from itself included) of from's type that a walk
+    // comparing property with text must not skip: its property is readable text equal to text,
+    // or no text to compare (absent, unreadable, failing, another kind). -1 when there is none.
+    // Answered from an index built on first use for each type and property, so that a lookup by
+    // name costs no walk; the tree must not change once it is asked (a copy starts afresh).
+    int nextComparable(int from, unsigned int property, const std::string& text) const;
+
+private:
+    struct PropertyIndex;
+    // Indexes built so far; a copy of the tree starts without any.
+    class Indexes {
+    public:
+        Indexes();
+        ~Indexes();
+        Indexes(const Indexes&) : Indexes() {}
+        Indexes& operator=(const Indexes&);
+        const PropertyIndex& of(const Tree& tree, unsigned int type, unsigned int property);
+
+    private:
+        std::mutex mutex_;
+        std::map<std::pair<unsigned int, unsigned int>, std::unique_ptr<PropertyIndex>> built_;
+    };
+    mutable Indexes indexes_;
 };
 
 class Backend {

@@ -24,6 +24,13 @@ public:
 
     // Next node of the current node's type.
     Instrumentation& operator++();
+    // Moves forward (staying when the current node qualifies) to the next node of the current type
+    // whose property may equal text: one holding text as readable text, or one whose property
+    // cannot be read as text. The nodes passed over are exactly those whose property is readable
+    // text other than text. False (past the end) when no node is left.
+    bool seek(NodeLexicon::Properties property, const std::string& text);
+    // The parent of the current node, in the same picture. False (past the end) for the root.
+    bool selectParent();
     explicit operator bool() const;
 
     std::string getNodeDescription() const;   // empty past the end

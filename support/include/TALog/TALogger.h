@@ -29,6 +29,10 @@ public:
     static void traceLevelMessage(const char* function, const char* file, int line, const std::string& component,
                                   int level, const char* unused, int unused2, int unused3, const char* text);
 
+    // True when a record of level would be kept (it is not below the threshold), so that callers
+    // format a record's text only when it is written somewhere.
+    static bool isEnabled(int level);
+
     // Re-reads the environment (tests change it between cases).
     static void reconfigure();
 
