@@ -147,16 +147,29 @@ std::size_t utf8Length(const std::string& s, std::size_t i, std::uint32_t& cp) {
 // s with each control character (C0, DEL, C1), each character of extra and each byte that is
 // not part of well-formed UTF-8 replaced by escape(value): the code point, or the byte itself.
 template <class Escape>
-std::string escapeText(const std::string& s, const char* extra, Escape escape) {
-    std::string out;
-    out.reserve(s.size());
+void escapeInto(std::string& out, const std::string& s, const char* extra, Escape escape) {
+    // Printable ASCII that is not in extra goes out as it stands, a run at a time.
+    const auto plain = [extra](unsigned char c) {
+        if (c < 0x20 || c >= 0x7F) return false;
+        for (const char* e = extra; *e; ++e)
+            if (c == static_cast<unsigned char>(*e)) return false;
+        return true;
+    };
+    out.reserve(out.size() + s.size());
     for (std::size_t i = 0; i < s.size();) {
+        std::size_t run = i;
+        while (run < s.size() && plain(static_cast<unsigned char>(s[run]))) ++run;
+        if (run > i) {
+            out.append(s, i, run - i);
+            i = run;
+            continue;
+        }
         std::uint32_t cp = 0;
         std::size_t n = utf8Length(s, i, cp);
         if (n == 0) {
             out += escape(static_cast<unsigned char>(s[i]));
             ++i;
-        } else if (cp < 0x20 || (cp >= 0x7F && cp <= 0x9F) || (cp < 0x80 && std::strchr(extra, s[i]))) {
+        } else if (cp <= 0x9F) {  // a control character, DEL, C1 or one of extra
             out += escape(cp);
             i += n;
         } else {
@@ -164,6 +177,12 @@ std::string escapeText(const std::string& s, const char* extra, Escape escape) {
             i += n;
         }
     }
+}
+
+template <class Escape>
+std::string escapeText(const std::string& s, const char* extra, Escape escape) {
+    std::string out;
+    escapeInto(out, s, extra, escape);
     return out;
 }
 
@@ -182,6 +201,10 @@ std::string escapeOne(std::uint32_t c, bool json) {
 // terminal sequence. \xHH as MOF strings spell it.
 std::string printable(const std::string& s) {
     return escapeText(s, "", [](std::uint32_t c) { return escapeOne(c, false); });
+}
+
+void appendPrintable(std::string& out, const std::string& s) {
+    escapeInto(out, s, "", [](std::uint32_t c) { return escapeOne(c, false); });
 }
 
 // A JSON string that is valid whatever the bytes: control characters are escaped, and a byte
@@ -247,12 +270,21 @@ void printInstances(const std::vector<Instance>& instances, bool json, std::ostr
         out << "]\n";
         return;
     }
+    std::string text;  // one write per instance
     for (std::size_t i = 0; i < instances.size(); ++i) {
         // Instance::toMof's layout, with names and values made printable.
-        out << (i ? "\n" : "") << "instance of " << printable(instances[i].className()) << " {\n";
-        for (const auto& p : instances[i].properties)
-            out << "    " << printable(p.first) << " = " << printable(p.second.toText()) << ";\n";
-        out << "};\n";
+        text.assign(i ? "\ninstance of " : "instance of ");
+        appendPrintable(text, instances[i].className());
+        text += " {\n";
+        for (const auto& p : instances[i].properties) {
+            text += "    ";
+            appendPrintable(text, p.first);
+            text += " = ";
+            appendPrintable(text, p.second.toText());
+            text += ";\n";
+        }
+        text += "};\n";
+        out.write(text.data(), static_cast<std::streamsize>(text.size()));
     }
 }
 

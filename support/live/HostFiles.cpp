@@ -1,9 +1,10 @@
 #include "HostFiles.h"
 
+#include <algorithm>
 #include <cerrno>
+#include <ctime>
 #include <dirent.h>
 #include <sstream>
-#include <sys/inotify.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -150,77 +151,76 @@ bool makeDirectories(const std::string& path) {
     return ::mkdir(path.c_str(), 0755) == 0 || errno == EEXIST;
 }
 
-ChangeWatch::ChangeWatch() : fd_(::inotify_init1(IN_NONBLOCK | IN_CLOEXEC)) {}
+namespace {
 
-ChangeWatch::~ChangeWatch() {
-    if (fd_ >= 0) ::close(fd_);
+// File times come from a clock that advances in ticks of a few milliseconds: a second change
+// within the tick of a stamp would leave the stamp as it is.
+constexpr long long kTickNs = 20 * 1000 * 1000;
+
+long long nanoseconds(const struct timespec& t) { return t.tv_sec * 1000000000LL + t.tv_nsec; }
+
+long long realtimeNs() {
+    struct timespec now {};
+    ::clock_gettime(CLOCK_REALTIME, &now);
+    return nanoseconds(now);
 }
 
-ChangeWatch::Stamp ChangeWatch::stamp(const std::string& path) {
+}  // namespace
+
+long long ChangeWatch::add(const std::string& path) {
     Stamp s;
     s.path = path;
     struct stat info {};
+    long long latest = 0;
     if (::stat(path.c_str(), &info) == 0) {
         s.exists = true;
         s.seconds = info.st_mtim.tv_sec;
         s.nanoseconds = info.st_mtim.tv_nsec;
         s.inode = info.st_ino;
         s.size = info.st_size;
+        latest = std::max(nanoseconds(info.st_mtim), nanoseconds(info.st_ctim));
     }
-    return s;
+    stamps_.push_back(std::move(s));
+    return latest;
+}
+
+long long ChangeWatch::stampAll(const std::vector<std::string>& directories, const std::vector<std::string>& files) {
+    stamps_.clear();
+    long long latest = 0;
+    for (const std::string& directory : directories) {
+        latest = std::max(latest, add(directory));
+        DIR* dir = ::opendir(directory.c_str());
+        if (!dir) continue;
+        while (const dirent* entry = ::readdir(dir)) {
+            const std::string name = entry->d_name;
+            if (name != "." && name != "..") latest = std::max(latest, add(directory + "/" + name));
+        }
+        ::closedir(dir);
+    }
+    for (const std::string& path : files) latest = std::max(latest, add(path));
+    return latest;
 }
 
 void ChangeWatch::watch(const std::vector<std::string>& directories, const std::vector<std::string>& files) {
-    stamps_.clear();
-    if (fd_ < 0) {
-        for (const std::string& path : directories) stamps_.push_back(stamp(path));
-        for (const std::string& path : files) stamps_.push_back(stamp(path));
-        return;
-    }
-    for (auto it = watches_.begin(); it != watches_.end();) {
-        bool wanted = false;
-        for (const std::string& directory : directories) wanted = wanted || directory == it->first;
-        if (wanted) {
-            ++it;
-        } else {
-            ::inotify_rm_watch(fd_, it->second);
-            it = watches_.erase(it);
+    const long long latest = stampAll(directories, files);
+    // Something changed within the current tick: let the tick pass and stamp again, so that any
+    // later change, even one right after the caller's reading, carries a newer time.
+    const long long wait = latest + kTickNs - realtimeNs();
+    if (wait > 0 && wait <= kTickNs) {
+        struct timespec pause {0, static_cast<long>(wait)};
+        while (::nanosleep(&pause, &pause) != 0 && errno == EINTR) {
         }
+        stampAll(directories, files);
     }
-    const std::uint32_t mask = IN_CREATE | IN_DELETE | IN_MODIFY | IN_CLOSE_WRITE | IN_MOVED_FROM | IN_MOVED_TO |
-                               IN_DELETE_SELF | IN_MOVE_SELF | IN_ONLYDIR;
-    for (const std::string& directory : directories) {
-        const int wd = ::inotify_add_watch(fd_, directory.c_str(), mask);
-        if (wd >= 0) {
-            watches_[directory] = wd;
-        } else {
-            watches_.erase(directory);
-            stamps_.push_back(stamp(directory));  // appears later: noticed by its stamp
-        }
-    }
-    changed();  // forget what happened before
 }
 
 bool ChangeWatch::changed() {
+    const std::vector<Stamp> before = std::move(stamps_);
+    stamps_.clear();
     bool result = false;
-    if (fd_ >= 0) {
-        alignas(inotify_event) char buffer[4096];
-        for (;;) {
-            const ssize_t n = ::read(fd_, buffer, sizeof buffer);
-            if (n > 0) {
-                result = true;
-                continue;
-            }
-            if (n < 0 && errno == EINTR) continue;
-            break;
-        }
-    }
-    for (const Stamp& before : stamps_) {
-        const Stamp now = stamp(before.path);
-        if (now.exists != before.exists || now.seconds != before.seconds || now.nanoseconds != before.nanoseconds ||
-            now.inode != before.inode || now.size != before.size) {
-            result = true;
-        }
+    for (const Stamp& was : before) {
+        add(was.path);
+        result = result || !(stamps_.back() == was);
     }
     return result;
 }

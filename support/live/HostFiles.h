@@ -41,17 +41,13 @@ std::map<std::string, std::map<std::string, std::string>> readInterfaceFiles(con
 // Creates the directory and its missing parents (mode 0755). False when it cannot.
 bool makeDirectories(const std::string& path);
 
-// Notices changes to files in a set of directories: inotify where the kernel offers it, otherwise
-// (and for directories that do not exist yet) by comparing stat() results.
+// Notices changes to the configuration files by comparing stat() results: each watched directory
+// (entries added, removed or renamed) and every file in it (edited in place), and single files
+// (followed through links). No inotify: closing an inotify instance that holds watches waits for
+// the kernel to retire them (milliseconds), which a one-request process pays at every exit.
 class ChangeWatch {
 public:
-    ChangeWatch();
-    ~ChangeWatch();
-    ChangeWatch(const ChangeWatch&) = delete;
-    ChangeWatch& operator=(const ChangeWatch&) = delete;
-
-    // Watches the directories from now on, and, without inotify, these files too. Changes before
-    // this call are forgotten.
+    // Watches from now on; changes before this call are forgotten.
     void watch(const std::vector<std::string>& directories, const std::vector<std::string>& files);
     // True when something watched changed since watch() or the previous call.
     bool changed();
@@ -64,11 +60,15 @@ private:
         long nanoseconds = 0;
         ino_t inode = 0;
         off_t size = 0;
+        bool operator==(const Stamp& o) const {
+            return exists == o.exists && seconds == o.seconds && nanoseconds == o.nanoseconds && inode == o.inode &&
+                   size == o.size;
+        }
     };
-    static Stamp stamp(const std::string& path);
+    // Stamps the path; returns the time (ns) of its latest change, 0 when it does not exist.
+    long long add(const std::string& path);
+    long long stampAll(const std::vector<std::string>& directories, const std::vector<std::string>& files);
 
-    int fd_ = -1;
-    std::map<std::string, int> watches_;  // directory -> watch descriptor
     std::vector<Stamp> stamps_;
 };
 

@@ -1,8 +1,8 @@
 // The live backend: one cached picture of the host, rebuilt from three kernel dumps and the
 // configuration files only when something changed, so that a request over N interfaces costs a
 // bounded number of dumps however large N is. What counts as a change: a netlink notification
-// (links, addresses, routes of either family), an inotify event (or, without inotify, a changed
-// stat) in the ifcfg directory or the resolver's directory, a new host name, another IPIF_ROOT,
+// (links, addresses, routes of either family), a changed stat() of the ifcfg directory, of a file
+// in it or of the resolver configuration, a new host name, another IPIF_ROOT,
 // IPIF_DATA_DIR or IPIF_BMC_INTERFACES, and our own writes. Change checks happen when a snapshot
 // is asked for; no thread runs in the background.
 #include "Nx/LiveBackend.h"
@@ -169,12 +169,7 @@ private:
         paths_ = now;
         hostName_ = hostName;
         // Watch first, read afterwards: a change that races with the reading forces another rebuild.
-        std::vector<std::string> directories{now.dataDirectory, parentOf(now.resolver)};
-        char real[PATH_MAX];
-        if (::realpath(now.resolver.c_str(), real) && parentOf(real) != directories.back()) {
-            directories.push_back(parentOf(real));
-        }
-        files_.watch(directories, {now.resolver});
+        files_.watch({now.dataDirectory}, {now.resolver});
         events_.drainNotifications();
 
         const Live::KernelState kernel = requests_.readState();
