@@ -101,8 +101,8 @@ int main(int argc, char** argv) {
     const double ip = median(runs, [] {
         if (std::system("ip -o addr show > /dev/null") != 0) std::fprintf(stderr, "ip failed\n");
     });
-    // Cold runs use a fresh backend each; backends are dropped only after the timing, because
-    // closing an inotify descriptor waits for an RCU grace period (~15 ms) that no request pays.
+    // Cold runs use a fresh backend each; backends are dropped only after the timing, so that
+    // their teardown is not measured as a request.
     std::vector<std::shared_ptr<Nx::HostModel::Backend>> fresh;
     for (int i = 0; i < 2 * runs; ++i) fresh.push_back(Nx::HostModel::openLiveBackend());
     std::size_t next = 0;
