@@ -101,11 +101,9 @@ unsigned int ipv6Type(const std::string& text) {
 
 std::string maskText(unsigned int prefix) {
     const std::uint32_t mask = prefix == 0 ? 0 : 0xffffffffu << (32 - (prefix > 32 ? 32 : prefix));
-    in_addr address{};
-    address.s_addr = htonl(mask);
-    char text[INET_ADDRSTRLEN] = {};
-    inet_ntop(AF_INET, &address, text, sizeof text);
-    return text;
+    const unsigned char bytes[4] = {static_cast<unsigned char>(mask >> 24), static_cast<unsigned char>(mask >> 16),
+                                    static_cast<unsigned char>(mask >> 8), static_cast<unsigned char>(mask)};
+    return ipv4Text(bytes);
 }
 
 // The key's value in the interface's ifcfg file, empty when either is missing.

@@ -51,7 +51,8 @@ void forEachAttribute(const char* data, std::size_t length, F&& f) {
 
 std::string addressText(unsigned char family, const char* data, std::size_t length) {
     char text[INET6_ADDRSTRLEN] = {};
-    if ((family == AF_INET && length == 4) || (family == AF_INET6 && length == 16)) {
+    if (family == AF_INET && length == 4) return ipv4Text(reinterpret_cast<const unsigned char*>(data));
+    if (family == AF_INET6 && length == 16) {
         if (inet_ntop(family, data, text, sizeof text)) return text;
     }
     return std::string();
@@ -159,6 +160,19 @@ void parseRoute(const char* body, std::size_t length, KernelState& state) {
 }
 
 }  // namespace
+
+std::string ipv4Text(const unsigned char bytes[4]) {
+    char text[INET_ADDRSTRLEN];
+    char* at = text;
+    for (int i = 0; i < 4; ++i) {
+        unsigned int b = bytes[i];
+        if (i) *at++ = '.';
+        if (b >= 100) *at++ = static_cast<char>('0' + b / 100);
+        if (b >= 10) *at++ = static_cast<char>('0' + b / 10 % 10);
+        *at++ = static_cast<char>('0' + b % 10);
+    }
+    return std::string(text, static_cast<std::size_t>(at - text));
+}
 
 NetlinkSocket::NetlinkSocket(unsigned int groups) : buffer_(kBufferSize) {
     fd_ = ::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC | (groups ? SOCK_NONBLOCK : 0), NETLINK_ROUTE);

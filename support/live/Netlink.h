@@ -13,6 +13,10 @@
 namespace Nx {
 namespace Live {
 
+// Dotted-quad text of four address bytes in network order, as inet_ntop writes it, without the
+// formatted printing inet_ntop goes through: a large host has thousands of addresses.
+std::string ipv4Text(const unsigned char bytes[4]);
+
 struct KernelLink {
     int index = 0;
     std::string name;

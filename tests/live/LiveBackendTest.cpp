@@ -2,6 +2,7 @@
 // at a scratch directory: the node tree's shape and system node, when the picture is rebuilt, and
 // the writes and refusals. What the tree says per interface (addresses, gateways, origin, state)
 // is held against ip(8) and the ifcfg files once, through the provider (LiveProviderTest).
+#include <arpa/inet.h>
 #include <gtest/gtest.h>
 #include <sched.h>
 #include <sys/wait.h>
@@ -14,6 +15,7 @@
 #include <vector>
 
 #include "LiveNamespace.h"
+#include "Netlink.h"
 #include "Nx/LiveBackend.h"
 #include "Nx/NodeLexicon.h"
 #include "Nx/PlatformUtilities.h"
@@ -62,6 +64,17 @@ protected:
 
     std::shared_ptr<Nx::HostModel::Backend> backend_;
 };
+
+// Addresses are printed without inet_ntop; every byte value must read as inet_ntop writes it.
+TEST(LiveText, Ipv4TextMatchesInetNtop) {
+    for (unsigned v = 0; v < 256; ++v) {
+        const unsigned char bytes[4] = {static_cast<unsigned char>(v), static_cast<unsigned char>(255 - v), 0,
+                                        static_cast<unsigned char>(v * 7)};
+        char expected[INET_ADDRSTRLEN];
+        ASSERT_NE(inet_ntop(AF_INET, bytes, expected, sizeof expected), nullptr);
+        EXPECT_EQ(Nx::Live::ipv4Text(bytes), expected);
+    }
+}
 
 TEST_F(LiveHost, TreeShapeAndSystemNodeFollowTheKernelAndTheFiles) {
     ASSERT_NO_FATAL_FAILURE(buildNetwork());
