@@ -208,15 +208,24 @@ bool NetlinkSocket::dump(std::uint16_t type, unsigned char family, Handler&& han
     struct {
         nlmsghdr header;
         union {
-            ifinfomsg link;
+            struct {
+                ifinfomsg info;
+                rtattr maskAttribute;
+                std::uint32_t mask;
+            } link;
             ifaddrmsg address;
             rtmsg route;
         } body;
     } request{};
     std::size_t bodySize = sizeof(rtgenmsg);
     if (type == RTM_GETLINK) {
-        request.body.link.ifi_family = family;
-        bodySize = sizeof(ifinfomsg);
+        // Counters are neither read nor wanted: the kernel then skips summing them per link.
+        request.body.link.info.ifi_family = family;
+        request.body.link.maskAttribute.rta_type = IFLA_EXT_MASK;
+        request.body.link.maskAttribute.rta_len = RTA_LENGTH(sizeof(std::uint32_t));
+        request.body.link.mask = RTEXT_FILTER_SKIP_STATS;
+        bodySize = NLMSG_ALIGN(sizeof(ifinfomsg)) + RTA_LENGTH(sizeof(std::uint32_t));
+        static_assert(sizeof(ifinfomsg) % NLMSG_ALIGNTO == 0 && sizeof(rtattr) == RTA_LENGTH(0), "packed request");
     } else if (type == RTM_GETADDR) {
         request.body.address.ifa_family = family;
         bodySize = sizeof(ifaddrmsg);
