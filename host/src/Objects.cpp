@@ -417,7 +417,7 @@ CMPIData makeData(HostImpl* host, const Value& v, CMPIValueState extraState, Are
         return d;
     }
     if (v.isArray()) {
-        d.value.array = makeIn<ArrayObj>(a, host, v.type(), v.elements());
+        d.value.array = makeIn<ArrayObj>(a, host, v.type(), v.elements().vector());
         return d;
     }
     fillValue(host, a, v.type(), v.elements()[0], d.value);

@@ -466,48 +466,48 @@ Value Value::scalar(CimType type, Element element) {
     v.type_ = type;
     if (element.index() == 0) return v;
     v.null_ = false;
-    v.elements_.push_back(std::move(element));
+    v.scalar_ = std::move(element);
     return v;
 }
 
 bool Value::asBool() const {
-    if (null_ || array_ || elements_.empty() || elements_[0].index() != 1) wrongKind("a boolean");
-    return std::get<bool>(elements_[0]);
+    if (null_ || array_ || scalar_.index() != 1) wrongKind("a boolean");
+    return std::get<bool>(scalar_);
 }
 
 std::uint64_t Value::asUnsigned() const {
-    if (null_ || array_ || elements_.empty() || elements_[0].index() != 2) wrongKind("unsigned");
-    return std::get<std::uint64_t>(elements_[0]);
+    if (null_ || array_ || scalar_.index() != 2) wrongKind("unsigned");
+    return std::get<std::uint64_t>(scalar_);
 }
 
 std::int64_t Value::asSigned() const {
-    if (null_ || array_ || elements_.empty() || elements_[0].index() != 3) wrongKind("signed");
-    return std::get<std::int64_t>(elements_[0]);
+    if (null_ || array_ || scalar_.index() != 3) wrongKind("signed");
+    return std::get<std::int64_t>(scalar_);
 }
 
 double Value::asReal() const {
-    if (null_ || array_ || elements_.empty() || elements_[0].index() != 4) wrongKind("a real");
-    return std::get<double>(elements_[0]);
+    if (null_ || array_ || scalar_.index() != 4) wrongKind("a real");
+    return std::get<double>(scalar_);
 }
 
 const std::string& Value::asString() const {
-    if (null_ || array_ || elements_.empty() || elements_[0].index() != 5) wrongKind("text");
-    return std::get<std::string>(elements_[0]);
+    if (null_ || array_ || scalar_.index() != 5) wrongKind("text");
+    return std::get<std::string>(scalar_);
 }
 
 const ObjectPath& Value::asReference() const {
-    if (null_ || array_ || elements_.empty() || elements_[0].index() != 6) wrongKind("a reference");
-    return *std::get<ObjectPathPtr>(elements_[0]);
+    if (null_ || array_ || scalar_.index() != 6) wrongKind("a reference");
+    return *std::get<ObjectPathPtr>(scalar_);
 }
 
 const Instance& Value::asInstance() const {
-    if (null_ || array_ || elements_.empty() || elements_[0].index() != 7) wrongKind("an instance");
-    return *std::get<InstancePtr>(elements_[0]);
+    if (null_ || array_ || scalar_.index() != 7) wrongKind("an instance");
+    return *std::get<InstancePtr>(scalar_);
 }
 
 std::string Value::toText() const {
     if (null_) return "NULL";
-    if (!array_) return elements_.empty() ? "NULL" : elementText(type_, elements_[0], true);
+    if (!array_) return scalar_.index() == 0 ? "NULL" : elementText(type_, scalar_, true);
     std::string out = "{";
     for (std::size_t i = 0; i < elements_.size(); ++i) {
         if (i) out += ", ";
@@ -522,7 +522,7 @@ Value Value::parse(CimType type, bool array, const std::string& text) {
         Value v;
         v.type_ = type;
         v.null_ = false;
-        v.elements_.push_back(parseElement(type, text));
+        v.scalar_ = parseElement(type, text);
         return v;
     }
     std::string body = trim(text);
@@ -536,9 +536,10 @@ Value Value::parse(CimType type, bool array, const std::string& text) {
 bool Value::operator==(const Value& other) const {
     if (type_ != other.type_ || array_ != other.array_ || null_ != other.null_) return false;
     if (null_) return true;
-    if (elements_.size() != other.elements_.size()) return false;
-    for (std::size_t i = 0; i < elements_.size(); ++i)
-        if (!elementsEqual(elements_[i], other.elements_[i])) return false;
+    const ElementRange mine = elements(), theirs = other.elements();
+    if (mine.size() != theirs.size()) return false;
+    for (std::size_t i = 0; i < mine.size(); ++i)
+        if (!elementsEqual(mine[i], theirs[i])) return false;
     return true;
 }
 

@@ -80,6 +80,26 @@ using InstancePtr = std::shared_ptr<const Instance>;
 using Element = std::variant<std::monostate, bool, std::uint64_t, std::int64_t, double, std::string,
                              ObjectPathPtr, InstancePtr>;
 
+// A read-only view of a value's elements.
+class ElementRange {
+public:
+    ElementRange(const Element* first, std::size_t count) : first_(first), count_(count) {}
+    const Element* begin() const { return first_; }
+    const Element* end() const { return first_ + count_; }
+    std::size_t size() const { return count_; }
+    bool empty() const { return count_ == 0; }
+    const Element& operator[](std::size_t i) const { return first_[i]; }
+    const Element& at(std::size_t i) const {
+        if (i >= count_) throw std::out_of_range("element index");
+        return first_[i];
+    }
+    std::vector<Element> vector() const { return std::vector<Element>(begin(), end()); }
+
+private:
+    const Element* first_;
+    std::size_t count_;
+};
+
 class Value {
 public:
     Value();  // a null string
@@ -114,8 +134,10 @@ public:
     bool isNull() const { return null_; }
 
     // Arrays: the elements. Scalars: one element (none when null).
-    const std::vector<Element>& elements() const { return elements_; }
-    std::size_t size() const { return elements_.size(); }
+    ElementRange elements() const {
+        return array_ ? ElementRange(elements_.data(), elements_.size()) : ElementRange(&scalar_, null_ ? 0 : 1);
+    }
+    std::size_t size() const { return elements().size(); }
 
     // Scalar accessors. They throw std::logic_error when the value is null, an array, or of
     // another kind (asUnsigned on a signed value and the like).
@@ -143,7 +165,10 @@ private:
     CimType type_ = CimType::String;
     bool array_ = false;
     bool null_ = true;
-    std::vector<Element> elements_;
+    // A scalar's element is held in place: a value is made for every property a provider sets,
+    // and nearly all are scalars.
+    Element scalar_;
+    std::vector<Element> elements_;  // an array's
 };
 
 // An ordered list of named values; names compare case-insensitively and keep the spelling they
