@@ -6,7 +6,6 @@
 #include "Nx/PlatformUtilities.h"
 #include "Nx/PropertyFile.h"
 #include "Nx/String.h"
-#include "TALog/TAMessageBuffer.h"
 #include "Trace.h"
 
 namespace Nx {
@@ -61,9 +60,7 @@ bool isSafeConfigurationKey(const std::string& key) {
 bool isSafeConfigurationValue(const std::string& value) { return Nx::isPlainValue(value); }
 
 bool updateConfigurationValue(const std::string& fileName, const std::string& key, const std::string& value) {
-    TALog::TAMessageBuffer parameters;
-    parameters << " fileName=" << fileName << " key=" << key;
-    const std::string list = parameters.str();
+    const TraceParams list(" fileName=", fileName, " key=", key);
     NX_ENTER_PARAMS(loggerConfigurationFile, list.c_str());
 
     bool written = false;

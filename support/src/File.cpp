@@ -184,16 +184,28 @@ bool openDirectory(const std::string& path, File::Scope scope, Directory& dir) {
     return failWith(EACCES);
 }
 
-// A temporary sibling of the target, locked from creation until it is renamed into place or
-// removed, so that removeStaleTemporaries can tell it from one a killed writer left.
-class Temporary {
+// A locked file beside the target that its owner removes when done: the name goes first, then
+// the descriptor (and with it the lock), so nobody can lock a name that is about to vanish.
+class OwnedSibling {
 public:
-    explicit Temporary(int directory) : directory_(directory) {}
-    ~Temporary() {
+    explicit OwnedSibling(int directory) : directory_(directory) {}
+    ~OwnedSibling() {
         if (!name_.empty()) ::unlinkat(directory_, name_.c_str(), 0);
     }
-    Temporary(const Temporary&) = delete;
-    Temporary& operator=(const Temporary&) = delete;
+    OwnedSibling(const OwnedSibling&) = delete;
+    OwnedSibling& operator=(const OwnedSibling&) = delete;
+
+protected:
+    int directory_;
+    std::string name_;  // empty: nothing to remove
+    Descriptor fd_;     // destroyed after the destructor body removed the name
+};
+
+// A temporary sibling of the target, locked from creation until it is renamed into place or
+// removed, so that removeStaleTemporaries can tell it from one a killed writer left.
+class Temporary : public OwnedSibling {
+public:
+    using OwnedSibling::OwnedSibling;
 
     bool create(const std::string& base) {
         for (int attempt = 0; attempt < 100; ++attempt) {
@@ -214,11 +226,6 @@ public:
     int fd() const { return fd_.get(); }
     const std::string& name() const { return name_; }
     void release() { name_.clear(); }
-
-private:
-    int directory_;
-    std::string name_;
-    Descriptor fd_;  // closed (and unlocked) only after the destructor removed the name
 };
 
 bool isTemporaryOf(const std::string& entry, const std::string& base) {
@@ -302,14 +309,9 @@ bool replace(const std::string& path, const Directory& dir, const std::string& c
 // write renames a new file over it). Its holder removes it while still holding the lock; a waiter
 // that then gets the lock finds the name gone or on another file and starts again, so exactly one
 // holder at a time has the lock on the file the name refers to.
-class UpdateLock {
+class UpdateLock : public OwnedSibling {
 public:
-    explicit UpdateLock(int directory) : directory_(directory) {}
-    ~UpdateLock() {
-        if (!name_.empty()) ::unlinkat(directory_, name_.c_str(), 0);
-    }
-    UpdateLock(const UpdateLock&) = delete;
-    UpdateLock& operator=(const UpdateLock&) = delete;
+    using OwnedSibling::OwnedSibling;
 
     bool acquire(const std::string& name) {
         for (;;) {
@@ -329,11 +331,6 @@ public:
         name_ = name;
         return true;
     }
-
-private:
-    int directory_;
-    std::string name_;
-    Descriptor fd_;  // closed (and unlocked) only after the destructor removed the name
 };
 
 }  // namespace
