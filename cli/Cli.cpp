@@ -1,5 +1,7 @@
 #include "Cli.h"
 
+#include <algorithm>
+#include <charconv>
 #include <cmath>
 #include <cstdint>
 #include <cstdio>
@@ -204,7 +206,38 @@ std::string printable(const std::string& s) {
 }
 
 void appendPrintable(std::string& out, const std::string& s) {
+    if (std::all_of(s.begin(), s.end(), [](char c) { return c >= 0x20 && c < 0x7F; })) {
+        out += s;  // names and most values: nothing to escape
+        return;
+    }
     escapeInto(out, s, "", [](std::uint32_t c) { return escapeOne(c, false); });
+}
+
+// Value::toText() made printable. The common scalars are written straight into out: most of an
+// enumeration's output is plain strings and numbers.
+void appendValueText(std::string& out, const Value& v) {
+    if (!v.isArray() && v.size() == 1) {
+        const Element& e = v.elements()[0];
+        if (e.index() == 5) {
+            const std::string& s = std::get<std::string>(e);
+            const bool plain = std::all_of(s.begin(), s.end(), [](char c) {
+                return c >= 0x20 && c < 0x7F && c != '"' && c != '\\';
+            });
+            if (plain) {
+                out += '"';
+                out += s;
+                out += '"';
+                return;
+            }
+        } else if ((e.index() == 2 && v.type() != CimType::Char16) || e.index() == 3) {
+            char digits[24];
+            const auto written = e.index() == 2 ? std::to_chars(digits, digits + sizeof digits, std::get<std::uint64_t>(e))
+                                                : std::to_chars(digits, digits + sizeof digits, std::get<std::int64_t>(e));
+            out.append(digits, written.ptr);
+            return;
+        }
+    }
+    appendPrintable(out, v.toText());
 }
 
 // A JSON string that is valid whatever the bytes: control characters are escaped, and a byte
@@ -263,30 +296,50 @@ std::string jsonInstance(const Instance& inst) {
            ", \"properties\": " + jsonNamed(inst.properties) + "}";
 }
 
-void printInstances(const std::vector<Instance>& instances, bool json, std::ostream& out) {
-    if (json) {
-        out << "[";
-        for (std::size_t i = 0; i < instances.size(); ++i) out << (i ? ",\n " : "") << jsonInstance(instances[i]);
-        out << "]\n";
-        return;
+// Prints instances as the provider returns them, one write each; JSON output is one array.
+class InstancePrinter {
+public:
+    InstancePrinter(bool json, std::ostream& out)
+        : json_(json), out_(out), sink_([this](const Instance& inst) { print(inst); }) {}
+    InstancePrinter(const InstancePrinter&) = delete;
+    InstancePrinter& operator=(const InstancePrinter&) = delete;
+
+    const InstanceSink* sink() const { return &sink_; }
+    std::size_t count() const { return count_; }
+    // Ends the output, also when nothing came.
+    void close() {
+        if (json_) out_ << (count_ ? "]\n" : "[]\n");
     }
-    std::string text;  // one write per instance
-    for (std::size_t i = 0; i < instances.size(); ++i) {
-        // Instance::toMof's layout, with names and values made printable.
-        text.assign(i ? "\ninstance of " : "instance of ");
-        appendPrintable(text, instances[i].className());
-        text += " {\n";
-        for (const auto& p : instances[i].properties) {
-            text += "    ";
-            appendPrintable(text, p.first);
-            text += " = ";
-            appendPrintable(text, p.second.toText());
-            text += ";\n";
+
+private:
+    void print(const Instance& inst) {
+        if (json_) {
+            text_.assign(count_ ? ",\n " : "[");
+            text_ += jsonInstance(inst);
+        } else {
+            // Instance::toMof's layout, with names and values made printable.
+            text_.assign(count_ ? "\ninstance of " : "instance of ");
+            appendPrintable(text_, inst.className());
+            text_ += " {\n";
+            for (const auto& p : inst.properties) {
+                text_ += "    ";
+                appendPrintable(text_, p.first);
+                text_ += " = ";
+                appendValueText(text_, p.second);
+                text_ += ";\n";
+            }
+            text_ += "};\n";
         }
-        text += "};\n";
-        out.write(text.data(), static_cast<std::streamsize>(text.size()));
+        out_.write(text_.data(), static_cast<std::streamsize>(text_.size()));
+        ++count_;
     }
-}
+
+    bool json_;
+    std::ostream& out_;
+    InstanceSink sink_;
+    std::string text_;
+    std::size_t count_ = 0;
+};
 
 void printPaths(const std::vector<ObjectPath>& paths, bool json, std::ostream& out) {
     if (json) {
@@ -446,17 +499,19 @@ void dispatch(Host& host, const Options& o, std::ostream& out) {
             r = host.enumerateInstanceNames(c.nameSpace, c.className);
             printPaths(r.paths, json, out);
         } else {
-            r = host.enumerateInstances(c.nameSpace, c.className);
-            printInstances(r.instances, json, out);
+            InstancePrinter printer(json, out);
+            r = host.enumerateInstances(c.nameSpace, c.className, nullptr, printer.sink());
+            printer.close();
         }
         finish(r);
     } else if (cmd == "gi") {
         need(o, 1, 1, "gi PATH");
         ObjectPath p = pathArgument(host, a[1]);
-        r = host.getInstance(p);
-        printInstances(r.instances, json, out);
+        InstancePrinter printer(json, out);
+        r = host.getInstance(p, nullptr, printer.sink());
+        printer.close();
         finish(r);
-        if (r.instances.empty()) throw Failure{2, 6, "no instance matches " + p.toString()};
+        if (!printer.count()) throw Failure{2, 6, "no instance matches " + p.toString()};
     } else if (cmd == "mi" || cmd == "ci") {
         need(o, cmd == "mi" ? 2 : 1, a.size(), (cmd + " PATH Prop=value ...").c_str());
         ObjectPath p = pathArgument(host, a[1]);
@@ -477,8 +532,9 @@ void dispatch(Host& host, const Options& o, std::ostream& out) {
     } else if (cmd == "eq") {
         need(o, 2, 3, "eq CLASS QUERY [LANGUAGE]");
         ObjectPath c = classArgument(host, a[1]);
-        r = host.execQuery(c.nameSpace, c.className, a[2], a.size() > 3 ? a[3] : "WQL");
-        printInstances(r.instances, json, out);
+        InstancePrinter printer(json, out);
+        r = host.execQuery(c.nameSpace, c.className, a[2], a.size() > 3 ? a[3] : "WQL", printer.sink());
+        printer.close();
         finish(r);
     } else if (cmd == "ai" || cmd == "ain") {
         need(o, 1, 1, (cmd + " PATH [-ac CLASS] [-rc CLASS] [-r ROLE] [-rr ROLE]").c_str());
@@ -486,8 +542,9 @@ void dispatch(Host& host, const Options& o, std::ostream& out) {
         checkFilterClass(host, o.assocClass, "-ac");
         checkFilterClass(host, o.resultClass, "-rc");
         if (cmd == "ai") {
-            r = host.associators(p, o.assocClass, o.resultClass, o.role, o.resultRole);
-            printInstances(r.instances, json, out);
+            InstancePrinter printer(json, out);
+            r = host.associators(p, o.assocClass, o.resultClass, o.role, o.resultRole, nullptr, printer.sink());
+            printer.close();
         } else {
             r = host.associatorNames(p, o.assocClass, o.resultClass, o.role, o.resultRole);
             printPaths(r.paths, json, out);
@@ -501,8 +558,9 @@ void dispatch(Host& host, const Options& o, std::ostream& out) {
         std::string assoc = o.resultClass.empty() ? o.assocClass : o.resultClass;
         checkFilterClass(host, assoc, "-rc");
         if (cmd == "ri") {
-            r = host.references(p, assoc, o.role);
-            printInstances(r.instances, json, out);
+            InstancePrinter printer(json, out);
+            r = host.references(p, assoc, o.role, nullptr, printer.sink());
+            printer.close();
         } else {
             r = host.referenceNames(p, assoc, o.role);
             printPaths(r.paths, json, out);

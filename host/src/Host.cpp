@@ -343,6 +343,7 @@ const Registration* Host::Impl::registrationFor(const std::string& ns, const std
 }
 
 void Host::Impl::finish(Result& r, Collector& c, const CMPIStatus& st) {
+    if (c.sinkFailure) std::rethrow_exception(c.sinkFailure);
     for (auto& i : c.instances) r.instances.push_back(std::move(i));
     for (auto& p : c.paths) r.paths.push_back(std::move(p));
     r.done = r.done || c.done;
@@ -355,8 +356,9 @@ void Host::Impl::finish(Result& r, Collector& c, const CMPIStatus& st) {
 // One call into a provider: the context, result and object path it is handed, and what it
 // hands back.
 struct Host::Impl::Call {
-    Call(Impl* h, const ObjectPath& path, const NamedValues* entries) : host(h) {
+    Call(Impl* h, const ObjectPath& path, const NamedValues* entries, const InstanceSink* sink = nullptr) : host(h) {
         col.nameSpace = h->nameSpaceOf(path);
+        col.sink = sink;
         ctx = h->newContext(col.nameSpace, entries);
         res = make<ResultObj>(h, &col);
         ObjectPath full = path;
@@ -413,7 +415,7 @@ MI* Host::Impl::serving(const ObjectPath& path, Kind kind, CMPIrc none, Result& 
 }
 
 Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std::vector<std::string>* props,
-                             const NamedValues* ctx) {
+                             const NamedValues* ctx, const InstanceSink* sink) {
     std::string ns = nameSpaceOf(classPath);
     Result result;
     if (unknownNamespace(regs, ns, result)) return result;
@@ -428,7 +430,7 @@ Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std:
     for (const Registration* reg : targets) {
         auto* mi = miOf<CMPIInstanceMI>(*providerOf(*reg), Kind::Instance, result);
         if (!mi) return result;
-        Call call(this, ObjectPath(ns, repo.find(reg->className)->name), ctx);
+        Call call(this, ObjectPath(ns, repo.find(reg->className)->name), ctx, sink);
         CharList pl(props);
         const char* noTable = "provider has no function table";
         if (names)
@@ -440,10 +442,11 @@ Result Host::Impl::enumerate(const ObjectPath& classPath, bool names, const std:
     return result;
 }
 
-Result Host::Impl::get(const ObjectPath& path, const std::vector<std::string>* props, const NamedValues* ctx) {
+Result Host::Impl::get(const ObjectPath& path, const std::vector<std::string>* props, const NamedValues* ctx,
+                       const InstanceSink* sink) {
     Result result;
     if (auto* mi = serving<CMPIInstanceMI>(path, Kind::Instance, CMPI_RC_ERR_NOT_FOUND, result)) {
-        Call call(this, path, ctx);
+        Call call(this, path, ctx, sink);
         CharList pl(props);
         call.run(result, mi, &CMPIInstanceMIFT::getInstance, "", pl.get());
     }
@@ -479,17 +482,17 @@ Result Host::Impl::remove(const ObjectPath& path, const NamedValues* ctx) {
 }
 
 Result Host::Impl::query(const ObjectPath& classPath, const std::string& queryText, const std::string& language,
-                         const NamedValues* ctx) {
+                         const NamedValues* ctx, const InstanceSink* sink) {
     Result result;
     if (auto* mi = serving<CMPIInstanceMI>(classPath, Kind::Instance, CMPI_RC_ERR_NOT_SUPPORTED, result))
-        Call(this, ObjectPath(classPath.nameSpace, classPath.className), ctx)
+        Call(this, ObjectPath(classPath.nameSpace, classPath.className), ctx, sink)
             .run(result, mi, &CMPIInstanceMIFT::execQuery, "", queryText.c_str(), orNull(language));
     return result;
 }
 
 Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& assocClass,
                          const std::string& resultClass, const std::string& role, const std::string& resultRole,
-                         const std::vector<std::string>* props, const NamedValues* ctx) {
+                         const std::vector<std::string>* props, const NamedValues* ctx, const InstanceSink* sink) {
     std::string ns = nameSpaceOf(path);
     Result result;
     if (unknownNamespace(regs, ns, result)) return result;
@@ -531,7 +534,7 @@ Result Host::Impl::assoc(AssocOp op, const ObjectPath& path, const std::string& 
         if (!mi) return result;
         std::vector<std::string> filters = filter.empty() ? group.second : std::vector<std::string>{filter};
         for (const auto& f : filters) {
-            Call call(this, full, ctx);
+            Call call(this, full, ctx, sink);
             CharList pl(props);
             const char* noTable = "provider has no function table";
             switch (op) {
@@ -622,12 +625,13 @@ Result Host::enumerateInstanceNames(const std::string& ns, const std::string& cl
     return run(impl_.get(), [&] { return impl_->enumerate(ObjectPath(ns, cls), true, nullptr, nullptr); });
 }
 
-Result Host::enumerateInstances(const std::string& ns, const std::string& cls, const std::vector<std::string>* props) {
-    return run(impl_.get(), [&] { return impl_->enumerate(ObjectPath(ns, cls), false, props, nullptr); });
+Result Host::enumerateInstances(const std::string& ns, const std::string& cls, const std::vector<std::string>* props,
+                                const InstanceSink* sink) {
+    return run(impl_.get(), [&] { return impl_->enumerate(ObjectPath(ns, cls), false, props, nullptr, sink); });
 }
 
-Result Host::getInstance(const ObjectPath& path, const std::vector<std::string>* props) {
-    return run(impl_.get(), [&] { return impl_->get(typed(impl_.get(), path), props, nullptr); });
+Result Host::getInstance(const ObjectPath& path, const std::vector<std::string>* props, const InstanceSink* sink) {
+    return run(impl_.get(), [&] { return impl_->get(typed(impl_.get(), path), props, nullptr, sink); });
 }
 
 Result Host::modifyInstance(const ObjectPath& path, const Instance& instance, const std::vector<std::string>* props) {
@@ -643,16 +647,16 @@ Result Host::deleteInstance(const ObjectPath& path) {
 }
 
 Result Host::execQuery(const std::string& ns, const std::string& cls, const std::string& query,
-                       const std::string& language) {
-    return run(impl_.get(), [&] { return impl_->query(ObjectPath(ns, cls), query, language, nullptr); });
+                       const std::string& language, const InstanceSink* sink) {
+    return run(impl_.get(), [&] { return impl_->query(ObjectPath(ns, cls), query, language, nullptr, sink); });
 }
 
 Result Host::associators(const ObjectPath& path, const std::string& assocClass, const std::string& resultClass,
                          const std::string& role, const std::string& resultRole,
-                         const std::vector<std::string>* props) {
+                         const std::vector<std::string>* props, const InstanceSink* sink) {
     return run(impl_.get(), [&] {
         return impl_->assoc(Impl::AssocOp::Associators, typed(impl_.get(), path), assocClass, resultClass, role,
-                            resultRole, props, nullptr);
+                            resultRole, props, nullptr, sink);
     });
 }
 
@@ -665,10 +669,10 @@ Result Host::associatorNames(const ObjectPath& path, const std::string& assocCla
 }
 
 Result Host::references(const ObjectPath& path, const std::string& resultClass, const std::string& role,
-                        const std::vector<std::string>* props) {
+                        const std::vector<std::string>* props, const InstanceSink* sink) {
     return run(impl_.get(), [&] {
         return impl_->assoc(Impl::AssocOp::References, typed(impl_.get(), path), "", resultClass, role, "", props,
-                            nullptr);
+                            nullptr, sink);
     });
 }
 

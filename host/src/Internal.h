@@ -7,6 +7,7 @@
 
 #include <atomic>
 #include <cstring>
+#include <exception>
 #include <map>
 #include <memory>
 #include <mutex>
@@ -57,6 +58,10 @@ struct InstanceObj : CMPIInstance, EncObject {
     Instance inst;
     bool filtered = false;
     std::vector<std::string> filter;
+    // inst's class in the repository, looked up at the first property set and again after the
+    // path changes.
+    const ClassRepository::ResolvedClass* resolved = nullptr;
+    bool resolvedKnown = false;
 };
 
 struct PathObj : CMPIObjectPath, EncObject {
@@ -107,6 +112,8 @@ struct Collector {
     std::vector<ObjectPath> paths;
     std::vector<Value> data;
     bool done = false;
+    const InstanceSink* sink = nullptr;  // takes the instances instead, when the caller gave one
+    std::exception_ptr sinkFailure;      // what the sink threw; the request fails with it
 };
 
 struct ResultObj : CMPIResult, EncObject {
@@ -249,19 +256,21 @@ public:
     detail::Arena& arena();  // the current request's, or hostArena outside requests
 
     // Operations. The caller holds a RequestScope. ctx: the caller's context entries (up-calls).
+    // sink: the caller's InstanceSink (none for up-calls).
     Result enumerate(const ObjectPath& classPath, bool names, const std::vector<std::string>* props,
-                     const NamedValues* ctx);
-    Result get(const ObjectPath& path, const std::vector<std::string>* props, const NamedValues* ctx);
+                     const NamedValues* ctx, const InstanceSink* sink = nullptr);
+    Result get(const ObjectPath& path, const std::vector<std::string>* props, const NamedValues* ctx,
+               const InstanceSink* sink = nullptr);
     Result modify(const ObjectPath& path, const Instance& inst, const std::vector<std::string>* props,
                   const NamedValues* ctx);
     Result create(const ObjectPath& path, const Instance& inst, const NamedValues* ctx);
     Result remove(const ObjectPath& path, const NamedValues* ctx);
     Result query(const ObjectPath& classPath, const std::string& query, const std::string& language,
-                 const NamedValues* ctx);
+                 const NamedValues* ctx, const InstanceSink* sink = nullptr);
     enum class AssocOp { Associators, AssociatorNames, References, ReferenceNames };
     Result assoc(AssocOp op, const ObjectPath& path, const std::string& assocClass, const std::string& resultClass,
                  const std::string& role, const std::string& resultRole, const std::vector<std::string>* props,
-                 const NamedValues* ctx);
+                 const NamedValues* ctx, const InstanceSink* sink = nullptr);
     Result invoke(const ObjectPath& path, const std::string& method, const Args& in, const NamedValues* ctx);
 
     // Namespace of a path or, when it has none, the default.

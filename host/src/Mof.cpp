@@ -425,16 +425,18 @@ std::vector<ClassDecl> parseMof(const std::string& text, const std::string& file
 template <class T>
 using ByName = std::unordered_map<std::string_view, T, HashIgnoreCase, EqualIgnoreCase>;
 
+struct ClassRepository::ResolvedClass {
+    const ClassDecl* decl = nullptr;
+    std::vector<PropertyDecl> properties;
+    std::vector<MethodDecl> methods;
+    std::vector<std::string> chain;
+    bool association = false;
+    // Where each of properties is, by name: a lookup per property set on an instance.
+    ByName<std::size_t> propertyAt;
+};
+
 struct ClassRepository::Data {
-    struct Resolved {
-        const ClassDecl* decl = nullptr;
-        std::vector<PropertyDecl> properties;
-        std::vector<MethodDecl> methods;
-        std::vector<std::string> chain;
-        bool association = false;
-        // Where each of properties is, by name: a lookup per property set on an instance.
-        ByName<std::size_t> propertyAt;
-    };
+    using Resolved = ResolvedClass;
     std::vector<std::unique_ptr<ClassDecl>> classes;
     ByName<const ClassDecl*> byName;
     ByName<Resolved> resolved;
@@ -570,10 +572,15 @@ const std::vector<PropertyDecl>& ClassRepository::properties(const std::string& 
 }
 
 const PropertyDecl* ClassRepository::property(std::string_view cls, std::string_view name) const {
-    const Data::Resolved* r = d_->get(cls);
-    if (!r) return nullptr;
-    auto it = r->propertyAt.find(name);
-    return it == r->propertyAt.end() ? nullptr : &r->properties[it->second];
+    return property(resolved(cls), name);
+}
+
+const ClassRepository::ResolvedClass* ClassRepository::resolved(std::string_view cls) const { return d_->get(cls); }
+
+const PropertyDecl* ClassRepository::property(const ResolvedClass* cls, std::string_view name) const {
+    if (!cls) return nullptr;
+    auto it = cls->propertyAt.find(name);
+    return it == cls->propertyAt.end() ? nullptr : &cls->properties[it->second];
 }
 
 const std::vector<MethodDecl>& ClassRepository::methods(const std::string& cls) const {

@@ -289,11 +289,9 @@ CMPIrc readScalar(const CMPIValue* v, CMPIType base, Element& e) {
     case CMPI_sint64: e = std::int64_t(v->sint64); return CMPI_RC_OK;
     case CMPI_real32: e = double(v->real32); return CMPI_RC_OK;
     case CMPI_real64: e = double(v->real64); return CMPI_RC_OK;
-    case CMPI_chars: {
-        const char* c = reinterpret_cast<const char*>(v);
-        e = std::string(c);
+    case CMPI_chars:
+        e.emplace<std::string>(reinterpret_cast<const char*>(v));
         return CMPI_RC_OK;
-    }
     case CMPI_charsptr:
         if (v->chars) e = std::string(v->chars);
         else e = std::monostate{};
@@ -621,7 +619,7 @@ char* strGetCharPtr(const CMPIString* s, CMPIStatus* rc) {
 
 // --- Instance
 
-bool inFilter(const InstanceObj* o, const std::string& name) {
+bool inFilter(const InstanceObj* o, std::string_view name) {
     if (!o->filtered) return true;
     for (const auto& f : o->filter)
         if (equalsIgnoreCase(f, name)) return true;
@@ -664,7 +662,11 @@ CMPIStatus instSetProperty(const CMPIInstance* i, const char* name, const CMPIVa
         if (r != CMPI_RC_OK) return rcStatus(r);
         HostImpl* h = o->host;
         const std::string& cls = o->inst.path.className;
-        const PropertyDecl* decl = h->repo.property(cls, name);
+        if (!o->resolvedKnown) {
+            o->resolved = h->repo.resolved(cls);
+            o->resolvedKnown = true;
+        }
+        const PropertyDecl* decl = h->repo.property(o->resolved, name);
         // A declared property implies a known class: the class is looked up again only when not.
         if (h->options.strictProperties && (decl || h->repo.exists(cls))) {
             if (!decl) return status(h, CMPI_RC_ERR_NO_SUCH_PROPERTY, "class " + cls + " has no property " + name);
@@ -718,7 +720,9 @@ CMPIStatus instSetObjectPath(CMPIInstance* i, const CMPIObjectPath* op) {
     PathObj* p = asPath(op);
     if (!p) return rcStatus(CMPI_RC_ERR_INVALID_PARAMETER);
     return guardedStatus([&] {
-        self<InstanceObj>(i)->inst.path = p->path;
+        InstanceObj* o = self<InstanceObj>(i);
+        o->inst.path = p->path;
+        o->resolvedKnown = false;
         return okStatus();
     });
 }
@@ -1054,6 +1058,22 @@ CMPIStatus resReturnInstance(const CMPIResult* r, const CMPIInstance* inst) {
     return guardedStatus([&] {
         Collector* c = sinkOf(r);
         if (!c) return closedResult(r);
+        if (c->sink) {
+            if (c->sinkFailure) return rcStatus(CMPI_RC_ERR_FAILED);
+            try {
+                if (i->inst.path.nameSpace.empty()) {
+                    Instance named = i->inst;
+                    named.path.nameSpace = c->nameSpace;
+                    (*c->sink)(named);
+                } else {
+                    (*c->sink)(i->inst);
+                }
+            } catch (...) {
+                c->sinkFailure = std::current_exception();
+                return rcStatus(CMPI_RC_ERR_FAILED);
+            }
+            return okStatus();
+        }
         c->instances.push_back(i->inst);
         if (c->instances.back().path.nameSpace.empty()) c->instances.back().path.nameSpace = c->nameSpace;
         return okStatus();

@@ -462,12 +462,7 @@ Value Value::array(CimType type, std::vector<Element> elements) {
 
 Value Value::scalar(CimType type, Element element) {
     if (!elementFits(type, element)) throw std::logic_error(std::string("element does not fit ") + typeName(type));
-    Value v;
-    v.type_ = type;
-    if (element.index() == 0) return v;
-    v.null_ = false;
-    v.scalar_ = std::move(element);
-    return v;
+    return Value(type, std::move(element));
 }
 
 bool Value::asBool() const {
@@ -545,19 +540,20 @@ bool Value::operator==(const Value& other) const {
 
 // ---- NamedValues ---------------------------------------------------------------------------
 
+// The lengths first: an instance's properties are set one by one, and each set looks at all.
 const Value* NamedValues::find(std::string_view name) const {
     for (const auto& item : items_)
-        if (equalsIgnoreCase(item.first, name)) return &item.second;
+        if (item.first.size() == name.size() && equalsIgnoreCase(item.first, name)) return &item.second;
     return nullptr;
 }
 
 Value* NamedValues::find(std::string_view name) {
-    for (auto& item : items_)
-        if (equalsIgnoreCase(item.first, name)) return &item.second;
-    return nullptr;
+    return const_cast<Value*>(static_cast<const NamedValues*>(this)->find(name));
 }
 
-void NamedValues::set(std::string_view name, Value value) {
+void NamedValues::set(std::string_view name, const Value& value) { set(name, Value(value)); }
+
+void NamedValues::set(std::string_view name, Value&& value) {
     if (Value* v = find(name)) {
         *v = std::move(value);
         return;

@@ -149,6 +149,43 @@ TEST_F(HostTest, AssociationsReachOtherProvidersThroughUpCalls) {
     EXPECT_EQ(host->associators(ObjectPath::parse("IPIFTEST_Nope.X=1")).rc, CMPI_RC_ERR_INVALID_CLASS);
 }
 
+TEST_F(HostTest, SinksTakeTheCallersInstancesAsTheyAreReturned) {
+    std::vector<Instance> seen;
+    const InstanceSink keep = [&](const Instance& inst) { seen.push_back(inst); };
+    const auto samePaths = [](const std::vector<Instance>& a, const std::vector<Instance>& b) {
+        if (a.size() != b.size()) return false;
+        for (std::size_t i = 0; i < a.size(); ++i)
+            if (a[i].path != b[i].path || !a[i].properties.sameAs(b[i].properties)) return false;
+        return true;
+    };
+
+    Result streamed = host->enumerateInstances("root/cimv2", "IPIFTEST_Widget", nullptr, &keep);
+    ASSERT_TRUE(streamed.ok()) << streamed.message;
+    EXPECT_TRUE(streamed.instances.empty());
+    EXPECT_TRUE(samePaths(seen, host->enumerateInstances("root/cimv2", "IPIFTEST_Widget").instances));
+
+    // The widget provider's own up-call for the gadgets keeps its answer: only what reaches the
+    // caller goes to the sink.
+    seen.clear();
+    ASSERT_TRUE(host->associators(widgetPath("w1"), "", "", "", "", nullptr, &keep).ok());
+    EXPECT_TRUE(samePaths(seen, host->associators(widgetPath("w1")).instances));
+    EXPECT_EQ(seen.size(), 2u);
+
+    // A failing sink ends the request with its reason and is not called again.
+    int calls = 0;
+    const InstanceSink failing = [&](const Instance&) {
+        ++calls;
+        throw std::runtime_error("output closed");
+    };
+    Result failed = host->enumerateInstances("root/cimv2", "IPIFTEST_Widget", nullptr, &failing);
+    EXPECT_EQ(failed.rc, CMPI_RC_ERR_FAILED);
+    EXPECT_EQ(failed.message, "output closed");
+    EXPECT_EQ(calls, 1);
+    const InstanceSink odd = [](const Instance&) { throw 7; };
+    EXPECT_THROW(host->getInstance(widgetPath("w1"), nullptr, &odd), int);
+    EXPECT_EQ(host->stats().liveObjects, 0);
+}
+
 TEST_F(HostTest, MethodsReturnValuesOutArgumentsAndStatuses) {
     Args in;
     in.set("NewSize", Value::uint16(12));

@@ -58,6 +58,7 @@
 
 #include <chrono>
 #include <cstddef>
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -91,10 +92,16 @@ struct HostOptions {
     static std::vector<std::string> splitList(const std::string& list);
 };
 
+// Receives each instance a provider returns, at the moment it returns it, in place of
+// Result::instances. An exception it throws ends the request once the provider has returned
+// (the provider's later returns fail): a CimError with its rc, another std::exception as
+// CMPI_RC_ERR_FAILED with its text, anything else reaches the caller as thrown.
+using InstanceSink = std::function<void(const Instance&)>;
+
 struct Result {
     int rc = 0;               // CMPI status code of the operation
     std::string message;      // the status message, if any
-    std::vector<Instance> instances;
+    std::vector<Instance> instances;  // none when the request was given an InstanceSink
     std::vector<ObjectPath> paths;
     bool hasReturnValue = false;
     Value returnValue;        // invokeMethod: the data the provider returned
@@ -127,26 +134,30 @@ public:
     ObjectPath parsePath(const std::string& text) const;
 
     Result enumerateInstanceNames(const std::string& nameSpace, const std::string& className);
+    // sink: where the instances go as they arrive; null collects them in Result::instances.
+    // Printing a large enumeration this way never holds the whole answer twice.
     Result enumerateInstances(const std::string& nameSpace, const std::string& className,
-                              const std::vector<std::string>* propertyList = nullptr);
-    Result getInstance(const ObjectPath& path, const std::vector<std::string>* propertyList = nullptr);
+                              const std::vector<std::string>* propertyList = nullptr,
+                              const InstanceSink* sink = nullptr);
+    Result getInstance(const ObjectPath& path, const std::vector<std::string>* propertyList = nullptr,
+                       const InstanceSink* sink = nullptr);
     // The instance's path is set to path; the provider receives both.
     Result modifyInstance(const ObjectPath& path, const Instance& instance,
                           const std::vector<std::string>* propertyList = nullptr);
     Result createInstance(const ObjectPath& path, const Instance& instance);  // paths: the new path
     Result deleteInstance(const ObjectPath& path);
     Result execQuery(const std::string& nameSpace, const std::string& className, const std::string& query,
-                     const std::string& language);
+                     const std::string& language, const InstanceSink* sink = nullptr);
     // Empty strings for the filters mean "none" (NULL to the provider).
     Result associators(const ObjectPath& path, const std::string& assocClass = "",
                        const std::string& resultClass = "", const std::string& role = "",
                        const std::string& resultRole = "",
-                       const std::vector<std::string>* propertyList = nullptr);
+                       const std::vector<std::string>* propertyList = nullptr, const InstanceSink* sink = nullptr);
     Result associatorNames(const ObjectPath& path, const std::string& assocClass = "",
                            const std::string& resultClass = "", const std::string& role = "",
                            const std::string& resultRole = "");
     Result references(const ObjectPath& path, const std::string& resultClass = "", const std::string& role = "",
-                      const std::vector<std::string>* propertyList = nullptr);
+                      const std::vector<std::string>* propertyList = nullptr, const InstanceSink* sink = nullptr);
     Result referenceNames(const ObjectPath& path, const std::string& resultClass = "", const std::string& role = "");
     Result invokeMethod(const ObjectPath& path, const std::string& method, const Args& in);
 

@@ -109,6 +109,11 @@ public:
     // redeclaration merged into the inherited slot. Empty / null when the class is unknown.
     const std::vector<PropertyDecl>& properties(const std::string& cls) const;
     const PropertyDecl* property(std::string_view cls, std::string_view name) const;
+    // A class found once for many lookups of its properties, as when an instance is filled;
+    // null for an unknown class. Valid until the repository changes.
+    struct ResolvedClass;
+    const ResolvedClass* resolved(std::string_view cls) const;
+    const PropertyDecl* property(const ResolvedClass* cls, std::string_view name) const;  // null cls: null
     const std::vector<MethodDecl>& methods(const std::string& cls) const;
     const MethodDecl* method(const std::string& cls, const std::string& name) const;
     std::vector<std::string> keyNames(const std::string& cls) const;

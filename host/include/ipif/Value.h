@@ -162,6 +162,10 @@ public:
     bool operator!=(const Value& other) const { return !(*this == other); }
 
 private:
+    // A scalar holding element, which fits type.
+    Value(CimType type, Element&& element)
+        : type_(type), null_(element.index() == 0), scalar_(std::move(element)) {}
+
     CimType type_ = CimType::String;
     bool array_ = false;
     bool null_ = true;
@@ -180,7 +184,8 @@ public:
     const Value* find(std::string_view name) const;
     Value* find(std::string_view name);
     // Replaces the value of an existing name (keeping its position) or appends.
-    void set(std::string_view name, Value value);
+    void set(std::string_view name, const Value& value);
+    void set(std::string_view name, Value&& value);
     bool erase(std::string_view name);
     void clear() { items_.clear(); }
     void reserve(std::size_t count) { items_.reserve(count); }
