@@ -84,6 +84,9 @@ std::shared_ptr<const Config> configuration;
 // dropped without touching the mutex.
 std::atomic<int> activeThreshold{kDefaultThreshold};
 std::once_flag loaded;
+// Set once the environment has been read. Checked before std::call_once, which touches
+// several thread-locals on every call: every trace point of a request asks for the level.
+std::atomic<bool> isLoaded{false};
 
 void reportConfigurationError(const Config& config);
 
@@ -95,7 +98,11 @@ void install(std::shared_ptr<const Config> fresh) {
 }
 
 void loadOnce() {
-    std::call_once(loaded, [] { install(readEnvironment()); });
+    if (isLoaded.load(std::memory_order_acquire)) return;
+    std::call_once(loaded, [] {
+        install(readEnvironment());
+        isLoaded.store(true, std::memory_order_release);
+    });
 }
 
 bool dropped(int level) {
