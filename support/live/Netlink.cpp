@@ -50,11 +50,8 @@ void forEachAttribute(const char* data, std::size_t length, F&& f) {
 }
 
 std::string addressText(unsigned char family, const char* data, std::size_t length) {
-    char text[INET6_ADDRSTRLEN] = {};
     if (family == AF_INET && length == 4) return ipv4Text(reinterpret_cast<const unsigned char*>(data));
-    if (family == AF_INET6 && length == 16) {
-        if (inet_ntop(family, data, text, sizeof text)) return text;
-    }
+    if (family == AF_INET6 && length == 16) return ipv6Text(reinterpret_cast<const unsigned char*>(data));
     return std::string();
 }
 
@@ -171,6 +168,54 @@ std::string ipv4Text(const unsigned char bytes[4]) {
         if (b >= 10) *at++ = static_cast<char>('0' + b / 10 % 10);
         *at++ = static_cast<char>('0' + b % 10);
     }
+    return std::string(text, static_cast<std::size_t>(at - text));
+}
+
+std::string ipv6Text(const unsigned char bytes[16]) {
+    unsigned int groups[8];
+    for (int i = 0; i < 8; ++i) groups[i] = (bytes[2 * i] << 8) | bytes[2 * i + 1];
+    // The longest run of zero groups; a single zero group is written out.
+    int bestAt = -1, bestLength = 0;
+    for (int i = 0; i < 8;) {
+        if (groups[i]) {
+            ++i;
+            continue;
+        }
+        int end = i;
+        while (end < 8 && !groups[end]) ++end;
+        if (end - i > bestLength) {
+            bestAt = i;
+            bestLength = end - i;
+        }
+        i = end;
+    }
+    if (bestLength < 2) bestAt = -1;
+
+    static const char hex[] = "0123456789abcdef";
+    char text[INET6_ADDRSTRLEN];
+    char* at = text;
+    for (int i = 0; i < 8; ++i) {
+        if (bestAt >= 0 && i >= bestAt && i < bestAt + bestLength) {
+            if (i == bestAt) *at++ = ':';
+            continue;
+        }
+        if (i) *at++ = ':';
+        if (i == 6 && bestAt == 0 && (bestLength == 6 || (bestLength == 5 && groups[5] == 0xffff))) {
+            const std::string tail = ipv4Text(bytes + 12);
+            std::memcpy(at, tail.data(), tail.size());
+            at += tail.size();
+            break;
+        }
+        bool started = false;
+        for (int shift = 12; shift >= 0; shift -= 4) {
+            const unsigned int digit = (groups[i] >> shift) & 0xf;
+            if (digit || started || shift == 0) {
+                *at++ = hex[digit];
+                started = true;
+            }
+        }
+    }
+    if (bestAt >= 0 && bestAt + bestLength == 8) *at++ = ':';
     return std::string(text, static_cast<std::size_t>(at - text));
 }
 

@@ -16,6 +16,10 @@ namespace Live {
 // Dotted-quad text of four address bytes in network order, as inet_ntop writes it, without the
 // formatted printing inet_ntop goes through: a large host has thousands of addresses.
 std::string ipv4Text(const unsigned char bytes[4]);
+// The same for sixteen IPv6 address bytes: the text inet_ntop writes, byte for byte (the longest
+// run of two or more zero groups as "::", the first of equal runs; the IPv4-compatible and
+// IPv4-mapped forms end in a dotted quad).
+std::string ipv6Text(const unsigned char bytes[16]);
 
 struct KernelLink {
     int index = 0;

@@ -76,6 +76,43 @@ TEST(LiveText, Ipv4TextMatchesInetNtop) {
     }
 }
 
+// Every placement and length of zero runs (each group zero or not, in two non-zero spellings),
+// the IPv4-compatible and -mapped forms, and random addresses.
+TEST(LiveText, Ipv6TextMatchesInetNtop) {
+    const auto check = [](const unsigned char (&bytes)[16]) {
+        char expected[INET6_ADDRSTRLEN];
+        ASSERT_NE(inet_ntop(AF_INET6, bytes, expected, sizeof expected), nullptr);
+        ASSERT_EQ(Nx::Live::ipv6Text(bytes), expected);
+    };
+    for (unsigned mask = 0; mask < 256; ++mask)
+        for (unsigned spelling = 0; spelling < 2; ++spelling) {
+            unsigned char bytes[16] = {};
+            for (int g = 0; g < 8; ++g)
+                if (mask & (1u << g)) {
+                    bytes[2 * g] = spelling ? 0xfe : 0x00;
+                    bytes[2 * g + 1] = static_cast<unsigned char>(spelling ? 0x80 + g : g + 1);
+                }
+            ASSERT_NO_FATAL_FAILURE(check(bytes));
+        }
+    for (unsigned tail : {0x00000000u, 0x00000001u, 0x0a000001u, 0xc0a80101u, 0xffffffffu})
+        for (unsigned five : {0x0000u, 0xffffu, 0xfffeu}) {
+            unsigned char bytes[16] = {};
+            bytes[10] = static_cast<unsigned char>(five >> 8);
+            bytes[11] = static_cast<unsigned char>(five);
+            for (int b = 0; b < 4; ++b) bytes[12 + b] = static_cast<unsigned char>(tail >> (24 - 8 * b));
+            ASSERT_NO_FATAL_FAILURE(check(bytes));
+        }
+    unsigned seed = 12345;
+    for (int n = 0; n < 2000; ++n) {
+        unsigned char bytes[16];
+        for (auto& b : bytes) {
+            seed = seed * 1103515245u + 12345u;
+            b = static_cast<unsigned char>((seed >> 16) % 4 == 0 ? 0 : seed >> 24);
+        }
+        ASSERT_NO_FATAL_FAILURE(check(bytes));
+    }
+}
+
 TEST_F(LiveHost, TreeShapeAndSystemNodeFollowTheKernelAndTheFiles) {
     ASSERT_NO_FATAL_FAILURE(buildNetwork());
     ::setenv("IPIF_BMC_INTERFACES", "wb, absent0", 1);
