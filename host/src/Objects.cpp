@@ -677,7 +677,11 @@ CMPIStatus instSetProperty(const CMPIInstance* i, const char* name, const CMPIVa
         }
         if (!inFilter(o, name) && !(decl && decl->key)) return okStatus();
         const std::string_view n = decl ? std::string_view(decl->name) : std::string_view(name);
-        if (decl && decl->key) o->inst.path.keys.set(n, v);
+        if (decl && decl->key) {
+            // Providers mostly set a key to the value their path already holds: no copy then.
+            const Value* held = o->inst.path.keys.find(n);
+            if (!held || *held != v) o->inst.path.keys.set(n, v);
+        }
         o->inst.properties.set(n, std::move(v));
         return okStatus();
     });

@@ -157,6 +157,7 @@ void addInterface(HostModel::Tree& tree, int parent, const Interface& i, const H
     const std::string description = bmc ? "BMC " + name : i.link->kind == "bridge" ? "Bridge" : name;
     const int index = addNode(tree, lan, P::IPEndpointNode, kEndpointName, description);
     HostModel::Node& node = tree.nodes[static_cast<std::size_t>(index)];
+    node.properties.reserve(12);  // the ones set below
     const bool v4 = i.ipv4 != nullptr;
     const bool v6 = i.ipv6 != nullptr;
     std::string ipv6 = fileValue(host, name, "IPV6ADDR");
@@ -165,17 +166,19 @@ void addInterface(HostModel::Tree& tree, int parent, const Interface& i, const H
         ipv6 = v6 ? i.ipv6->text : std::string();
         prefix = v6 ? i.ipv6->prefix : 0;
     }
-    readOnly(node, P::ElementName, PropertyValue::ofText(name));
+    // In ascending property order: each lands at the end of the node's list.
     node.properties[P::AddressOrigin] = PropertyValue::ofNumber(originOf(i, host));
     node.properties[P::IPv4Address] = PropertyValue::ofText(v4 ? i.ipv4->text : std::string());
     node.properties[P::SubnetMask] = PropertyValue::ofText(v4 ? maskText(i.ipv4->prefix) : std::string());
-    node.properties[P::IPv6Address] = PropertyValue::ofText(ipv6);
-    node.properties[P::PrefixLength] = PropertyValue::ofNumber(prefix);
-    readOnly(node, P::IPv6AddressType, PropertyValue::ofNumber(ipv6Type(ipv6)));
-    readOnly(node, P::IPVersion, PropertyValue::ofNumber((v4 ? 1u : 0u) | (v6 ? 2u : 0u)));
+    const unsigned int ipv6AddressType = ipv6Type(ipv6);
+    node.properties[P::IPv6Address] = PropertyValue::ofText(std::move(ipv6));
+    readOnly(node, P::IPv6AddressType, PropertyValue::ofNumber(ipv6AddressType));
     readOnly(node, P::ProtocolIFType, PropertyValue::ofNumber(v4 && v6 ? 4098 : v6 ? 4097 : v4 ? 4096 : 0));
+    readOnly(node, P::IPVersion, PropertyValue::ofNumber((v4 ? 1u : 0u) | (v6 ? 2u : 0u)));
     node.properties[P::IPv4Gateway] = PropertyValue::ofText(i.gateway4 ? i.gateway4->gateway : std::string());
     node.properties[P::IPv6Gateway] = PropertyValue::ofText(i.gateway6 ? i.gateway6->gateway : std::string());
+    node.properties[P::PrefixLength] = PropertyValue::ofNumber(prefix);
+    readOnly(node, P::ElementName, PropertyValue::ofText(name));
     node.properties[P::AdminState] = PropertyValue::ofNumber((i.link->flags & IFF_UP) ? 1 : 12);
 }
 

@@ -64,6 +64,10 @@ public:
     }
     // Inserts value unless the property is there; the second member says whether it was inserted.
     std::pair<iterator, bool> emplace(unsigned int property, PropertyValue value) {
+        if (items_.empty() || items_.back().first < property) {  // filled in ascending order
+            items_.emplace_back(property, std::move(value));
+            return {items_.end() - 1, true};
+        }
         auto at = slot(items_, property);
         if (at != items_.end() && at->first == property) return {at, false};
         return {items_.emplace(at, property, std::move(value)), true};
