@@ -1,6 +1,7 @@
 #include "Lindows/StaticIPAssignmentSettingData.h"
 
 #include "Lindows/ConfigurationFile.h"
+#include "Nx/String.h"
 
 namespace Nx {
 namespace IPInterfaceProvider {
@@ -106,14 +107,7 @@ bool StaticIPAssignmentSettingData::getIPv6SubnetPrefixLength(unsigned short& pr
     NX_ENTER(loggerStaticIPAssignmentSettingData);
     std::string path, text;
     if (filePath(path) && readConfigurationValue(path, "PREFIX", text)) {
-        // Decimal digits up to the first other character; nothing readable gives 0.
-        unsigned long parsed = 0;
-        for (char c : text) {
-            if (c < '0' || c > '9') break;
-            parsed = parsed * 10 + static_cast<unsigned long>(c - '0');
-            if (parsed > 1000000UL) break;  // no prefix is that long; stop before overflowing
-        }
-        prefixLength = static_cast<unsigned short>(parsed);
+        prefixLength = static_cast<unsigned short>(Nx::leadingDecimal(text));
     } else {
         unsigned int length = 0;
         if (instrumentation.getProperty(Properties::PrefixLength, length))

@@ -13,6 +13,7 @@
 #include <sstream>
 
 #include "Nx/HostModel.h"
+#include "Nx/String.h"
 #include "TALog/TALogger.h"
 #include "ipif/Host.h"
 
@@ -129,45 +130,24 @@ Options parseOptions(const std::vector<std::string>& args) {
 
 // ---- Output --------------------------------------------------------------------------------
 
-// Length (1 to 4) of the well-formed UTF-8 character at s[i], or 0 when the byte there starts
-// none: a stray continuation byte, an overlong form, a surrogate, beyond U+10FFFF or cut short.
-std::size_t utf8Length(const std::string& s, std::size_t i, std::uint32_t& cp) {
-    unsigned char c = static_cast<unsigned char>(s[i]);
-    std::size_t n = c < 0x80 ? 1 : (c & 0xE0) == 0xC0 ? 2 : (c & 0xF0) == 0xE0 ? 3 : (c & 0xF8) == 0xF0 ? 4 : 0;
-    if (n == 0 || i + n > s.size()) return 0;
-    cp = n == 1 ? c : c & (0x7F >> n);
-    for (std::size_t k = 1; k < n; ++k) {
-        unsigned char d = static_cast<unsigned char>(s[i + k]);
-        if ((d & 0xC0) != 0x80) return 0;
-        cp = cp << 6 | (d & 0x3F);
-    }
-    static const std::uint32_t least[] = {0, 0, 0x80, 0x800, 0x10000};
-    if (cp < least[n] || cp > 0x10FFFF || (cp >= 0xD800 && cp <= 0xDFFF)) return 0;
-    return n;
-}
-
 // s with each control character (C0, DEL, C1), each character of extra and each byte that is
 // not part of well-formed UTF-8 replaced by escape(value): the code point, or the byte itself.
 template <class Escape>
 void escapeInto(std::string& out, const std::string& s, const char* extra, Escape escape) {
-    // Printable ASCII that is not in extra goes out as it stands, a run at a time.
+    // Printable ASCII that is not in extra goes out as it stands, a run at a time (most text is
+    // one run).
     const auto plain = [extra](unsigned char c) {
-        if (c < 0x20 || c >= 0x7F) return false;
-        for (const char* e = extra; *e; ++e)
-            if (c == static_cast<unsigned char>(*e)) return false;
-        return true;
+        return c >= 0x20 && c < 0x7F && (!*extra || !std::strchr(extra, c));
     };
-    out.reserve(out.size() + s.size());
-    for (std::size_t i = 0; i < s.size();) {
-        std::size_t run = i;
-        while (run < s.size() && plain(static_cast<unsigned char>(s[run]))) ++run;
-        if (run > i) {
-            out.append(s, i, run - i);
-            i = run;
-            continue;
-        }
-        std::uint32_t cp = 0;
-        std::size_t n = utf8Length(s, i, cp);
+    const char* const text = s.data();
+    const std::size_t size = s.size();
+    for (std::size_t i = 0; i < size;) {
+        const std::size_t run = static_cast<std::size_t>(std::find_if_not(text + i, text + size, plain) - text);
+        out.append(text + i, run - i);
+        i = run;
+        if (i == size) break;
+        char32_t cp = 0;
+        const std::size_t n = Nx::utf8Length(s, i, cp);
         if (n == 0) {
             out += escape(static_cast<unsigned char>(s[i]));
             ++i;
@@ -175,7 +155,7 @@ void escapeInto(std::string& out, const std::string& s, const char* extra, Escap
             out += escape(cp);
             i += n;
         } else {
-            out.append(s, i, n);
+            out.append(text + i, n);
             i += n;
         }
     }
@@ -206,26 +186,20 @@ std::string printable(const std::string& s) {
 }
 
 void appendPrintable(std::string& out, const std::string& s) {
-    if (std::all_of(s.begin(), s.end(), [](char c) { return c >= 0x20 && c < 0x7F; })) {
-        out += s;  // names and most values: nothing to escape
-        return;
-    }
     escapeInto(out, s, "", [](std::uint32_t c) { return escapeOne(c, false); });
 }
 
-// Value::toText() made printable. The common scalars are written straight into out: most of an
-// enumeration's output is plain strings and numbers.
+// Value::toText() made printable, without building toText's string for the common scalars:
+// most of an enumeration's output is strings and numbers. A string that toText would not escape
+// (no '"' or '\\'; control characters are escaped alike either way) is the string in quotes.
 void appendValueText(std::string& out, const Value& v) {
     if (!v.isArray() && v.size() == 1) {
         const Element& e = v.elements()[0];
         if (e.index() == 5) {
             const std::string& s = std::get<std::string>(e);
-            const bool plain = std::all_of(s.begin(), s.end(), [](char c) {
-                return c >= 0x20 && c < 0x7F && c != '"' && c != '\\';
-            });
-            if (plain) {
+            if (std::none_of(s.begin(), s.end(), [](char c) { return c == '"' || c == '\\'; })) {
                 out += '"';
-                out += s;
+                appendPrintable(out, s);
                 out += '"';
                 return;
             }

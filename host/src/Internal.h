@@ -58,10 +58,8 @@ struct InstanceObj : CMPIInstance, EncObject {
     Instance inst;
     bool filtered = false;
     std::vector<std::string> filter;
-    // inst's class in the repository, looked up at the first property set and again after the
-    // path changes.
-    const ClassRepository::ResolvedClass* resolved = nullptr;
-    bool resolvedKnown = false;
+    // inst's class in the repository, for the property sets; follows the path's class.
+    const ClassRepository::ResolvedClass* resolved;
 };
 
 struct PathObj : CMPIObjectPath, EncObject {

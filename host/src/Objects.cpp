@@ -18,7 +18,8 @@ StringObj::StringObj(HostImpl* h, std::string s) : CMPIString(), EncObject(h), t
     hdl = &text[0];
     ft = &stringFT;
 }
-InstanceObj::InstanceObj(HostImpl* h, Instance i) : CMPIInstance(), EncObject(h), inst(std::move(i)) {
+InstanceObj::InstanceObj(HostImpl* h, Instance i)
+    : CMPIInstance(), EncObject(h), inst(std::move(i)), resolved(h->repo.resolved(inst.path.className)) {
     hdl = static_cast<EncObject*>(this);
     ft = &instanceFT;
 }
@@ -662,10 +663,6 @@ CMPIStatus instSetProperty(const CMPIInstance* i, const char* name, const CMPIVa
         if (r != CMPI_RC_OK) return rcStatus(r);
         HostImpl* h = o->host;
         const std::string& cls = o->inst.path.className;
-        if (!o->resolvedKnown) {
-            o->resolved = h->repo.resolved(cls);
-            o->resolvedKnown = true;
-        }
         const PropertyDecl* decl = h->repo.property(o->resolved, name);
         // A declared property implies a known class: the class is looked up again only when not.
         if (h->options.strictProperties && (decl || h->repo.exists(cls))) {
@@ -726,7 +723,7 @@ CMPIStatus instSetObjectPath(CMPIInstance* i, const CMPIObjectPath* op) {
     return guardedStatus([&] {
         InstanceObj* o = self<InstanceObj>(i);
         o->inst.path = p->path;
-        o->resolvedKnown = false;
+        o->resolved = o->host->repo.resolved(o->inst.path.className);
         return okStatus();
     });
 }

@@ -336,24 +336,6 @@ std::string rcName(int rc) {
     return "CMPI_RC_" + std::to_string(rc);
 }
 
-namespace {
-
-// ASCII only: CIM names are ASCII, and the result must not depend on the locale.
-inline unsigned char folded(char c) {
-    const auto u = static_cast<unsigned char>(c);
-    return u >= 'A' && u <= 'Z' ? static_cast<unsigned char>(u + ('a' - 'A')) : u;
-}
-
-}  // namespace
-
-bool equalsIgnoreCase(std::string_view a, std::string_view b) {
-    if (a.size() != b.size()) return false;
-    if (a == b) return true;  // names mostly come spelt as declared
-    for (std::size_t i = 0; i < a.size(); ++i)
-        if (folded(a[i]) != folded(b[i])) return false;
-    return true;
-}
-
 std::size_t HashIgnoreCase::operator()(std::string_view name) const {
     // Eight bytes at a time, each with bit 5 set: every upper-case letter hashes as its lower-case
     // one (a few other characters do too, which costs a comparison, never a wrong answer).
@@ -540,10 +522,9 @@ bool Value::operator==(const Value& other) const {
 
 // ---- NamedValues ---------------------------------------------------------------------------
 
-// The lengths first: an instance's properties are set one by one, and each set looks at all.
 const Value* NamedValues::find(std::string_view name) const {
     for (const auto& item : items_)
-        if (item.first.size() == name.size() && equalsIgnoreCase(item.first, name)) return &item.second;
+        if (equalsIgnoreCase(item.first, name)) return &item.second;
     return nullptr;
 }
 

@@ -56,6 +56,7 @@
 #include <unordered_map>
 
 #include "Nx/NodeLexicon.h"
+#include "Nx/String.h"
 
 namespace Nx {
 namespace Live {
@@ -114,15 +115,6 @@ std::string fileValue(const HostState& host, const std::string& name, const std:
     return found == file->second.end() ? std::string() : found->second;
 }
 
-// Leading decimal digits, as the static setting data reads PREFIX; 0 without any.
-unsigned int leadingNumber(const std::string& text) {
-    unsigned int number = 0;
-    for (std::size_t i = 0; i < text.size() && i < 6 && text[i] >= '0' && text[i] <= '9'; ++i) {
-        number = number * 10 + static_cast<unsigned int>(text[i] - '0');
-    }
-    return number;
-}
-
 unsigned int originOf(const Interface& i, const HostState& host) {
     const std::string protocol = fileValue(host, i.link->name, "BOOTPROTO");
     if (protocol == "dhcp" || protocol == "bootp") return 1;
@@ -137,31 +129,20 @@ void readOnly(HostModel::Node& node, unsigned int property, PropertyValue value)
     node.properties[property] = std::move(value);
 }
 
-int addNode(HostModel::Tree& tree, int parent, unsigned int type, const std::string& name,
-            const std::string& description) {
-    HostModel::Node node;
-    node.type = type;
-    node.name = name;
-    node.description = description;
-    node.parent = parent;
-    node.path = (parent < 0 ? std::string() : tree.nodes[static_cast<std::size_t>(parent)].path) + "/" + name;
-    tree.nodes.push_back(std::move(node));
-    return static_cast<int>(tree.nodes.size() - 1);
-}
-
 void addInterface(HostModel::Tree& tree, int parent, const Interface& i, const HostState& host, bool bmc) {
     const std::string& name = i.link->name;
-    const int lan = addNode(tree, parent, P::LanEndpointNode, name, name);
+    const int lan = tree.add(parent, P::LanEndpointNode, name, name);
     readOnly(tree.nodes[static_cast<std::size_t>(lan)], P::ElementName, PropertyValue::ofText(name));
 
     const std::string description = bmc ? "BMC " + name : i.link->kind == "bridge" ? "Bridge" : name;
-    const int index = addNode(tree, lan, P::IPEndpointNode, kEndpointName, description);
+    const int index = tree.add(lan, P::IPEndpointNode, kEndpointName, description);
     HostModel::Node& node = tree.nodes[static_cast<std::size_t>(index)];
     node.properties.reserve(12);  // the ones set below
     const bool v4 = i.ipv4 != nullptr;
     const bool v6 = i.ipv6 != nullptr;
     std::string ipv6 = fileValue(host, name, "IPV6ADDR");
-    unsigned int prefix = leadingNumber(fileValue(host, name, "PREFIX"));
+    // Read as the static setting data reads it.
+    unsigned int prefix = static_cast<unsigned int>(leadingDecimal(fileValue(host, name, "PREFIX")));
     if (ipv6.empty()) {
         ipv6 = v6 ? i.ipv6->text : std::string();
         prefix = v6 ? i.ipv6->prefix : 0;
@@ -227,7 +208,7 @@ HostModel::Tree buildTree(const KernelState& kernel, const HostState& host) {
 
     HostModel::Tree tree;
     tree.nodes.reserve(2 * interfaces.size() + 4);
-    const int system = addNode(tree, -1, P::SystemNode, kSystemName, "System");
+    const int system = tree.add(-1, P::SystemNode, kSystemName, "System");
     {
         HostModel::Node& node = tree.nodes[static_cast<std::size_t>(system)];
         node.properties[P::HostName] = PropertyValue::ofText(host.hostName);
@@ -246,7 +227,7 @@ HostModel::Tree buildTree(const KernelState& kernel, const HostState& host) {
         if (!isBmc(i.link->name)) addInterface(tree, system, i, host, false);
     }
     if (!host.bmcInterfaces.empty()) {
-        const int processor = addNode(tree, system, P::ServiceProcessorNode, kServiceProcessorName, "BMC");
+        const int processor = tree.add(system, P::ServiceProcessorNode, kServiceProcessorName, "BMC");
         for (const std::string& name : host.bmcInterfaces) {
             for (const Interface& i : interfaces) {
                 if (i.link->name == name) addInterface(tree, processor, i, host, true);

@@ -354,17 +354,9 @@ bool File::read(const std::string& path, std::string& content, std::string& erro
     return openRegular(AT_FDCWD, path, true, fd, error) && readOpen(fd.get(), content, error, info);
 }
 
-bool File::writeAtomically(const std::string& path, const std::string& content) {
-    return writeAtomically(path, content, Scope::Host);
-}
-
 bool File::writeAtomically(const std::string& path, const std::string& content, Scope scope) {
     Directory dir;
     return openDirectory(path, scope, dir) && replace(path, dir, content);
-}
-
-bool File::update(const std::string& path, const std::function<bool(std::string& content, bool exists)>& edit) {
-    return update(path, edit, Scope::Host);
 }
 
 bool File::update(const std::string& path, const std::function<bool(std::string& content, bool exists)>& edit,

@@ -35,7 +35,12 @@ bool quoteValue(const std::string& value, std::string& written) {
         return true;
     }
     written = "'";
-    for (const char c : value) written += c == '\'' ? std::string("'\\''") : std::string(1, c);
+    for (const char c : value) {
+        if (c == '\'')
+            written += "'\\''";
+        else
+            written += c;
+    }
     written += '\'';
     return true;
 }

@@ -58,58 +58,54 @@ std::string make_string(const std::wstring& text) {
     return out;
 }
 
+std::size_t utf8Length(const std::string& text, std::size_t at, char32_t& cp) {
+    const auto lead = static_cast<unsigned char>(text[at]);
+    const std::size_t length = lead < 0x80 ? 1 : (lead & 0xE0) == 0xC0 ? 2 : (lead & 0xF0) == 0xE0 ? 3
+                             : (lead & 0xF8) == 0xF0 ? 4 : 0;
+    if (length == 0 || at + length > text.size()) return 0;
+    cp = length == 1 ? lead : lead & (0x7F >> length);
+    for (std::size_t k = 1; k < length; ++k) {
+        const auto next = static_cast<unsigned char>(text[at + k]);
+        if ((next & 0xC0) != 0x80) return 0;
+        cp = (cp << 6) | (next & 0x3F);
+    }
+    static const char32_t least[] = {0, 0, 0x80, 0x800, 0x10000};
+    return cp < least[length] || !isScalar(cp) ? 0 : length;
+}
+
+unsigned long leadingDecimal(const std::string& text) {
+    unsigned long number = 0;
+    for (const char c : text) {
+        if (c < '0' || c > '9') break;
+        number = number * 10 + static_cast<unsigned long>(c - '0');
+        if (number > 1000000UL) break;
+    }
+    return number;
+}
+
 std::wstring make_wstring(const std::string& text) {
     std::wstring out;
     out.reserve(text.size());
-    const auto* bytes = reinterpret_cast<const unsigned char*>(text.data());
-    const size_t size = text.size();
-    size_t i = 0;
-    while (i < size) {
-        unsigned char lead = bytes[i];
-        char32_t c;
-        size_t length;
-        char32_t minimum;
-        if (lead < 0x80) {
-            c = lead;
-            length = 1;
-            minimum = 0;
-        } else if ((lead & 0xE0) == 0xC0) {
-            c = lead & 0x1F;
-            length = 2;
-            minimum = 0x80;
-        } else if ((lead & 0xF0) == 0xE0) {
-            c = lead & 0x0F;
-            length = 3;
-            minimum = 0x800;
-        } else if ((lead & 0xF8) == 0xF0) {
-            c = lead & 0x07;
-            length = 4;
-            minimum = 0x10000;
-        } else {
-            out += static_cast<wchar_t>(kEscapeBase + lead);
+    for (std::size_t i = 0; i < text.size();) {
+        char32_t c = 0;
+        const std::size_t length = utf8Length(text, i, c);
+        if (length == 0) {
+            // Not the start of a well-formed character: this byte is escaped and decoding resumes
+            // at the next one (a continuation byte there is escaped in turn).
+            out += static_cast<wchar_t>(kEscapeBase + static_cast<unsigned char>(text[i]));
             ++i;
             continue;
         }
-        size_t j = 1;
-        for (; j < length && i + j < size && (bytes[i + j] & 0xC0) == 0x80; ++j) c = (c << 6) | (bytes[i + j] & 0x3F);
-        // A truncated, overlong or out-of-range sequence: its lead byte is escaped and decoding
-        // resumes at the next byte (a continuation byte there is escaped in turn).
-        if (j < length || c < minimum || !isScalar(c)) {
-            out += static_cast<wchar_t>(kEscapeBase + lead);
-            ++i;
-            continue;
-        }
+        i += length;
         if constexpr (sizeof(wchar_t) == 2) {
             if (c >= 0x10000) {
                 c -= 0x10000;
                 out += static_cast<wchar_t>(0xD800 + (c >> 10));
                 out += static_cast<wchar_t>(0xDC00 + (c & 0x3FF));
-                i += length;
                 continue;
             }
         }
         out += static_cast<wchar_t>(c);
-        i += length;
     }
     return out;
 }

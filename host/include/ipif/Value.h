@@ -60,8 +60,17 @@ private:
 // "CMPI_RC_ERR_NOT_FOUND" for 6 and so on; "CMPI_RC_<n>" for a number CMPI does not name.
 std::string rcName(int rc);
 
-// Case-insensitive ASCII comparison, as CIM compares names.
-bool equalsIgnoreCase(std::string_view a, std::string_view b);
+// Case-insensitive ASCII comparison, as CIM compares names; ASCII only, so that the answer does
+// not depend on the locale. Inline: name searches call it for every name they pass, and most
+// of those differ in length.
+inline bool equalsIgnoreCase(std::string_view a, std::string_view b) {
+    if (a.size() != b.size()) return false;
+    if (a == b) return true;  // names mostly come spelt as declared
+    const auto folded = [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + ('a' - 'A')) : c; };
+    for (std::size_t i = 0; i < a.size(); ++i)
+        if (folded(a[i]) != folded(b[i])) return false;
+    return true;
+}
 // Hash and equality of names that ignore ASCII case, for maps keyed by name.
 struct HashIgnoreCase {
     std::size_t operator()(std::string_view name) const;

@@ -50,8 +50,7 @@ public:
     // written through nor replaced, and so is a path outside the scope (Host when not given).
     // Temporaries of the same target left by a killed writer are removed on the way. False, with
     // the old file untouched, on any failure or refusal.
-    static bool writeAtomically(const std::string& path, const std::string& content);
-    static bool writeAtomically(const std::string& path, const std::string& content, Scope scope);
+    static bool writeAtomically(const std::string& path, const std::string& content, Scope scope = Scope::Host);
 
     // Read-modify-write under an exclusive lock shared by every thread and process that updates
     // the same path through this call, so no update is lost. edit receives the current content
@@ -59,10 +58,8 @@ public:
     // True when the edited content was written; false when edit declined, the write was refused
     // as writeAtomically refuses it, or anything failed. The lock is a hidden sibling
     // ".<name>.lock" that its holder removes again.
-    static bool update(const std::string& path,
-                       const std::function<bool(std::string& content, bool exists)>& edit);
-    static bool update(const std::string& path,
-                       const std::function<bool(std::string& content, bool exists)>& edit, Scope scope);
+    static bool update(const std::string& path, const std::function<bool(std::string& content, bool exists)>& edit,
+                       Scope scope = Scope::Host);
 
     // Tests only: called with the step name ("create", "write", "fsync", "rename") before each step
     // of writeAtomically; returning true makes that step fail as the system call would (a failed
